@@ -1,0 +1,1 @@
+#include "Editor/Tools/Quillet/quillet_PELoader.h"
