@@ -1,0 +1,187 @@
+#include "Runtime/Testing/Testing.h"
+
+#include <functional>
+
+#include "Editor/Tools/Quillet/quillet_PEImports.h"
+#include "Editor/Tools/Quillet/quillet_PELoaderTestSupport.h"
+
+using namespace PELoaderTest;
+
+namespace
+{
+    const char* kNotRun = "not written";
+
+    // One malformed variant of a fixture DLL and the message its load must fail with.
+    struct BrokenImage
+    {
+        const char* fixture;
+        std::function<void(RawImage&)> patch;
+        const char* message;
+    };
+
+    // File offset of the first lookup entry of the first import descriptor.
+    uint64_t FirstLookupEntry(RawImage& image)
+    {
+        PE_IMAGE_IMPORT_DESCRIPTOR desc{};
+        image.View().Read(image.FileOffset(image.Directory(kPEDirectoryImports).va), desc);
+        return image.FileOffset(desc.OriginalFirstThunk);
+    }
+
+    uint64_t RelocationBlockOffset(RawImage& image)
+    {
+        return image.FileOffset(image.Directory(kPEDirectoryBaseRelocations).va);
+    }
+
+    const BrokenImage kBrokenImages[] = {
+        {"EntryRecord.dll", [](RawImage& i) { i.bytes.resize(63); }, "Failed to load DLL: size smaller than PE header"},
+        {"EntryRecord.dll", [](RawImage& i) { i.bytes[1] = 'X'; },
+         "Failed to load DLL: not a windows DLL (DOS header field mismatch)"},
+        {"EntryRecord.dll", [](RawImage& i) { i.bytes[i.NtOffset() + 1] = 'X'; },
+         "Failed to load DLL: not a windows DLL (NT header field mismatch)"},
+        {"Pe32.dll", [](RawImage&) {}, "Failed to load DLL: not a 64 bit DLL"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint16_t>(i.OptionalField(0), 0x010B); },
+         "Failed to load DLL: not a 64 bit DLL"},
+        {"EntryRecord.dll", [](RawImage& i) { i.bytes.resize(64); }, "Failed to load DLL: NT headers outside the file"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<int32_t>(60, -8); }, "Failed to load DLL: NT headers outside the file"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<int32_t>(60, 0x7FFFFFF0); },
+         "Failed to load DLL: NT headers outside the file"},
+        {"EntryRecord.dll", [](RawImage& i) { i.bytes.resize(i.NtOffset() + 100); },
+         "Failed to load DLL: NT headers outside the file"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.OptionalField(56), 0); },
+         "Failed to load DLL: could not allocate memory for executable"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.OptionalField(60), 0x100000); },
+         "Failed to load DLL: headers outside the file"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.OptionalField(56), 0x200); },
+         "Failed to load DLL: headers outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.SectionOffset(1) + 12, 0x5000); },
+         "Failed to load DLL: section outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.SectionOffset(1) + 20, 0x7FFFF000); },
+         "Failed to load DLL: section data outside the file"},
+        {"EntryRecord.dll", [](RawImage& i) { i.bytes.resize(0x900); }, "Failed to load DLL: section data outside the file"},
+        // Args.dll's .data (section 2) has no raw data: a whole SectionAlignment is zeroed.
+        {"Args.dll", [](RawImage& i) { i.Patch<uint32_t>(i.SectionOffset(2) + 12, 0x4800); },
+         "Failed to load DLL: section outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint16_t>(i.NtOffset() + 20, 0xFFFF); },
+         "Failed to load DLL: section table outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(RelocationBlockOffset(i) + 4, 4); },
+         "Failed to load DLL: relocation block smaller than its header"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(RelocationBlockOffset(i) + 4, 0); },
+         "Failed to load DLL: relocation block smaller than its header"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(RelocationBlockOffset(i), 0x4FF8); },
+         "Failed to load DLL: relocation target outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.DirectoryOffset(kPEDirectoryBaseRelocations), 0x4FFC); },
+         "Failed to load DLL: relocation block outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(RelocationBlockOffset(i) + 4, 0x2000); },
+         "Failed to load DLL: relocation block outside the image"},
+        {"Bound.dll", [](RawImage& i) { i.Patch<uint32_t>(i.DirectoryOffset(kPEDirectoryImports), 0x2FF8); },
+         "Failed to load DLL: import descriptor outside the image"},
+        {"Bound.dll", [](RawImage& i) { i.Patch<uint64_t>(FirstLookupEntry(i), 0x7FFFFFF0); },
+         "Failed to load DLL: import name outside the image"},
+        // The hint fits in the image's last two bytes, the name starts right behind its end.
+        {"Bound.dll", [](RawImage& i) { i.Patch<uint64_t>(FirstLookupEntry(i), 0x2FFE); },
+         "Failed to load DLL: import name outside the image"},
+        {"Bound.dll", [](RawImage& i) { i.Patch<uint64_t>(FirstLookupEntry(i), (1ull << 63) | 5); },
+         "Failed to load DLL: import by ordinal is not supported"},
+        {"Bound.dll",
+         [](RawImage& i) { i.Patch<uint32_t>(i.FileOffset(i.Directory(kPEDirectoryImports).va), 0x7FFFFFF0); },
+         "Failed to load DLL: import lookup table outside the image"},
+        {"Bound.dll",
+         [](RawImage& i) { i.Patch<uint32_t>(i.FileOffset(i.Directory(kPEDirectoryImports).va) + 16, 0x2FFC); },
+         "Failed to load DLL: import address table outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.DirectoryOffset(kPEDirectoryExports), 0x4FE0); },
+         "Failed to load DLL: export table outside the image"},
+        {"EntryRecord.dll",
+         [](RawImage& i) { i.Patch<uint32_t>(i.FileOffset(i.Directory(kPEDirectoryExports).va) + 32, 0x4FF0); },
+         "Failed to load DLL: export table outside the image"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.OptionalField(16), 0x5000); },
+         "Failed to load DLL: entry point outside the image"},
+    };
+}
+
+UNIT_TEST_SUITE(PELoaderFailures)
+{
+    TEST(BrokenImages_FailWithTheirMessage_AndLeaveNothingMapped)
+    {
+        for (const BrokenImage& broken : kBrokenImages)
+        {
+            RawImage image = ReadFixture(broken.fixture);
+            CHECK(image.bytes.size() > 1024);
+            broken.patch(image);
+            const size_t mappingsBefore = CountExecMappings();
+            StdoutCapture capture;  // failures after the import step come after "  No imports"
+            LoadResult result = Load(image.bytes);
+            capture.Text();
+            CHECK_EQUAL(broken.message, result.message);
+            CHECK(result.module == nullptr);
+            CHECK_EQUAL(mappingsBefore, CountExecMappings());
+            PEFreeLibrary(result.module);
+        }
+    }
+
+    TEST(SixtyFourBytesOfDosHeader_PassTheSizeCheck)
+    {
+        RawImage image = ReadFixture("EntryRecord.dll");
+        image.bytes.resize(64);
+        image.Patch<int32_t>(60, 0);  // the NT headers would start at the "MZ"
+        CHECK_EQUAL("Failed to load DLL: not a windows DLL (NT header field mismatch)", Load(image.bytes).message);
+    }
+
+    TEST(NullData_IsTooSmall)
+    {
+        const char* message = kNotRun;
+        CHECK(PELoadLibrary(static_cast<const void*>(nullptr), 4096, nullptr, 0, &message) == nullptr);
+        CHECK_EQUAL("Failed to load DLL: size smaller than PE header", message);
+    }
+
+    TEST(NullOutErrorMsg_StillFailsWithNull)
+    {
+        RawImage image = ReadFixture("Pe32.dll");
+        CHECK(PELoadLibrary(image.bytes.data(), image.bytes.size(), nullptr, 0, nullptr) == nullptr);
+        CHECK(PELoadLibrary("/nonexistent/Missing.dll", nullptr, 0, nullptr) == nullptr);
+    }
+
+    TEST(FileForm_MissingPath_CouldNotOpen)
+    {
+        const char* message = kNotRun;
+        CHECK(PELoadLibrary("/nonexistent/Missing.dll", nullptr, 0, &message) == nullptr);
+        CHECK_EQUAL("Failed to load DLL: could not open file", message);
+        message = kNotRun;
+        CHECK(PELoadLibrary(static_cast<const char*>(nullptr), nullptr, 0, &message) == nullptr);
+        CHECK_EQUAL("Failed to load DLL: could not open file", message);
+    }
+
+    TEST(FileForm_PassesTheMemoryFormsMessageThrough)
+    {
+        char path[] = "/tmp/PELoaderEmptyXXXXXX";
+        int fd = mkstemp(path);
+        CHECK(fd >= 0);
+        close(fd);
+        const char* message = kNotRun;
+        CHECK(PELoadLibrary(path, nullptr, 0, &message) == nullptr);
+        CHECK_EQUAL("Failed to load DLL: size smaller than PE header", message);
+        message = kNotRun;
+        CHECK(PELoadLibrary(FixturePath("Pe32.dll").c_str(), nullptr, 0, &message) == nullptr);
+        CHECK_EQUAL("Failed to load DLL: not a 64 bit DLL", message);
+        unlink(path);
+    }
+
+    TEST(UnresolvedImports_FillTheStubAreaExactly_OneMoreFails)
+    {
+        CHECK_EQUAL(11397u, kMaxImportThunks);
+        LoadResult full = Load(BuildImportImage(kMaxImportThunks));
+        CHECK_EQUAL("(null)", full.message);
+        CHECK(full.module != nullptr);
+        if (full.module)
+        {
+            CHECK(full.module->thunksCurr == full.module->thunks + kMaxImportThunks * kImportThunkSize);
+            CHECK(full.module->thunksCurr + kImportThunkSize > full.module->thunks + full.module->thunksSize);
+        }
+        PEFreeLibrary(full.module);
+
+        const size_t mappingsBefore = CountExecMappings();
+        LoadResult over = Load(BuildImportImage(kMaxImportThunks + 1));
+        CHECK_EQUAL("Failed to load DLL: too many unresolved imports for the import stub area", over.message);
+        CHECK(over.module == nullptr);
+        CHECK_EQUAL(mappingsBefore, CountExecMappings());
+    }
+}

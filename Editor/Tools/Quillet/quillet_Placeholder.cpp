@@ -1,1 +1,0 @@
-#include "Editor/Tools/Quillet/quillet_PELoader.h"
