@@ -1,0 +1,161 @@
+#include "Runtime/Testing/Testing.h"
+
+#include "Editor/Tools/Quillet/quillet_ImportsTestSupport.h"
+
+#include <errno.h>
+#include <stdlib.h>
+#include <string.h>
+#include <sys/mman.h>
+#include <unistd.h>
+
+using namespace QuilletTest;
+
+namespace
+{
+    const unsigned int kMemCommit = 0x1000;
+    const unsigned int kMemReserve = 0x2000;
+    const unsigned int kMemDecommit = 0x4000;
+    const unsigned int kMemRelease = 0x8000;
+    const unsigned int kPageReadWrite = 4;
+
+    const size_t kPage = static_cast<size_t>(sysconf(_SC_PAGESIZE));
+
+    // msync fails with ENOMEM exactly when part of the range is not mapped.
+    bool IsMapped(void* page)
+    {
+        return msync(page, kPage, MS_ASYNC) == 0;
+    }
+
+    char* PageAt(void* base, size_t index) { return static_cast<char*>(base) + index * kPage; }
+
+    struct VirtualMemory
+    {
+        WinFn<void*, void*, unsigned long, unsigned int, unsigned int> alloc = Import<void*, void*, unsigned long, unsigned int, unsigned int>("VirtualAlloc");
+        WinFn<int, void*, unsigned long, unsigned int> free = Import<int, void*, unsigned long, unsigned int>("VirtualFree");
+    };
+}
+
+UNIT_TEST_SUITE(QuilletImportsMemory)
+{
+    TEST(Malloc_ReallocAndFree_UseTheHostHeap)
+    {
+        auto hostMalloc = Import<void*, unsigned long>("malloc");
+        auto hostRealloc = Import<void*, void*, unsigned long>("realloc");
+        auto hostFree = Import<void, void*>("free");
+        char* p = static_cast<char*>(hostMalloc(4));
+        memcpy(p, "abc", 4);
+        p = static_cast<char*>(hostRealloc(p, 4096));
+        CHECK_EQUAL("abc", p);
+        hostFree(p);
+        // Blocks from the other allocation names are host blocks as well.
+        free(Import<void*, unsigned long, int, const char*, int>("_malloc_dbg")(16, 1, "file.cpp", 12));
+        free(Import<void*, unsigned long>("_malloc_crt")(16));
+        hostFree(nullptr);
+    }
+
+    TEST(NewOperators_32BitManglingsIgnoreTheUpperHalfOfTheSize)
+    {
+        // A 32-bit caller leaves whatever it likes above the size: 2^40 + 16 must allocate 16 bytes.
+        for (const char* name : {"??2@YAPAXI@Z", "??_U@YAPAXI@Z"})
+        {
+            void* p = Import<void*, uint64_t>(name)((uint64_t(1) << 40) | 16);
+            CHECK(p != nullptr);
+            free(p);
+        }
+        for (const char* name : {"??2@YAPEAX_K@Z", "??_U@YAPEAX_K@Z"})
+        {
+            void* p = Import<void*, uint64_t>(name)(16);
+            CHECK(p != nullptr);
+            free(p);
+            // The 64-bit size is used whole: a size no host can give yields null, not a small block.
+            CHECK((Import<void*, uint64_t>(name)(uint64_t(1) << 62)) == nullptr);
+        }
+    }
+
+    TEST(DeleteOperators_FreeBlocksAndIgnoreNull)
+    {
+        for (const char* name : {"??3@YAXPAX@Z", "??_V@YAXPAX@Z", "??3@YAXPEAX@Z", "??_V@YAXPEAX@Z"})
+        {
+            auto destroy = Import<void, void*>(name);
+            CHECK(destroy != nullptr);
+            destroy(malloc(8));
+            destroy(nullptr);
+        }
+    }
+
+    TEST(Heaps_AreOneFictitiousHeapWithHandle1)
+    {
+        auto processHeap = Import<void*>("GetProcessHeap")();
+        auto created = Import<void*, unsigned int, unsigned long, unsigned long>("HeapCreate")(0, 1 << 20, 0);
+        CHECK_EQUAL(uintptr_t(1), reinterpret_cast<uintptr_t>(processHeap));
+        CHECK_EQUAL(uintptr_t(1), reinterpret_cast<uintptr_t>(created));
+        CHECK_EQUAL(1, (Import<int, void*>("HeapDestroy")(created)));
+
+        auto heapAlloc = Import<void*, void*, unsigned int, unsigned long>("HeapAlloc");
+        auto heapFree = Import<int, void*, unsigned int, void*>("HeapFree");
+        void* block = heapAlloc(created, 0, 100);
+        CHECK(block != nullptr);
+        CHECK_EQUAL(1, heapFree(processHeap, 0, block));
+    }
+
+    TEST(HeapAlloc_ZeroMemoryFlag_ClearsTheBlock)
+    {
+        auto heapAlloc = Import<void*, void*, unsigned int, unsigned long>("HeapAlloc");
+        // Dirty a block of the same size first, so that the allocator likely hands it back.
+        void* dirty = malloc(200);
+        memset(dirty, 0xAB, 200);
+        free(dirty);
+        unsigned char* block = static_cast<unsigned char*>(heapAlloc(reinterpret_cast<void*>(1), 0x8, 200));
+        bool allZero = true;
+        for (int i = 0; i < 200; ++i)
+            allZero = allZero && block[i] == 0;
+        CHECK(allZero);
+        free(block);
+    }
+
+    TEST(VirtualAlloc_CommitOfAnAddress_ReturnsItAndMapsNothing)
+    {
+        VirtualMemory vm;
+        void* hole = mmap(nullptr, kPage, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+        munmap(hole, kPage);
+        CHECK(vm.alloc(hole, kPage, kMemCommit, kPageReadWrite) == hole);
+        CHECK(!IsMapped(hole));
+    }
+
+    TEST(VirtualAlloc_WithoutAddress_MapsWritableMemoryThatReleaseUnmapsWhole)
+    {
+        VirtualMemory vm;
+        for (unsigned int type : {kMemCommit, kMemReserve | kMemCommit})
+        {
+            char* base = static_cast<char*>(vm.alloc(nullptr, 3 * kPage, type, kPageReadWrite));
+            CHECK(base != MAP_FAILED);
+            base[0] = 1;
+            base[3 * kPage - 1] = 2;
+            CHECK_EQUAL(1, vm.free(base, 0, kMemRelease));
+            CHECK(!IsMapped(PageAt(base, 0)));
+            CHECK(!IsMapped(PageAt(base, 2)));
+        }
+    }
+
+    TEST(VirtualFree_OfAnUnrecordedAddress_UnmapsNothing)
+    {
+        VirtualMemory vm;
+        void* page = mmap(nullptr, kPage, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+        CHECK_EQUAL(1, vm.free(page, 0, kMemRelease));
+        CHECK(IsMapped(page));
+        munmap(page, kPage);
+    }
+
+    TEST(VirtualFree_DecommitWithSize_UnmapsThatSizeAndForgetsTheRecord)
+    {
+        VirtualMemory vm;
+        char* base = static_cast<char*>(vm.alloc(nullptr, 2 * kPage, kMemReserve, kPageReadWrite));
+        CHECK_EQUAL(1, vm.free(base, kPage, kMemDecommit));
+        CHECK(!IsMapped(PageAt(base, 0)));
+        CHECK(IsMapped(PageAt(base, 1)));
+        // The record is gone: a release now finds length 0 and leaves the second page alone.
+        CHECK_EQUAL(1, vm.free(base, 0, kMemRelease));
+        CHECK(IsMapped(PageAt(base, 1)));
+        munmap(PageAt(base, 1), kPage);
+    }
+}
