@@ -1,0 +1,389 @@
+// End-to-end tests of ChartBake: the real binary, run in a fresh directory, with the bundled
+// libraries. CHARTBAKE_LIBRARY_BEHAVIOUR (read by the libraries) picks failing, warning,
+// crashing or announcing behaviour where a test needs it.
+#include "Runtime/Testing/ChildProcess.h"
+#include "Runtime/Testing/Testing.h"
+
+#include <cstdint>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string>
+#include <vector>
+
+namespace
+{
+    const std::string kBinDir = CHARTBAKE_BIN_DIR;
+    const char* const kBehaviour = "CHARTBAKE_LIBRARY_BEHAVIOUR=";
+
+    // Little-endian bytes of a raw binary mesh file, appended field by field.
+    struct Bytes
+    {
+        std::string data;
+        Bytes& U32(uint32_t v) { data.append(reinterpret_cast<const char*>(&v), 4); return *this; }
+        Bytes& F32(float v) { data.append(reinterpret_cast<const char*>(&v), 4); return *this; }
+    };
+
+    // Header of a binary mesh with packMargin 0.25, then the triangle (0,0,0) (4,0,0) (2,2,0):
+    // its longest edge first, its apex at (2, 2) once flattened, so the layout is exact.
+    Bytes BinaryHeader(uint32_t vertexCount, uint32_t triCount, uint32_t uvPresent, uint32_t srcPolyPresent)
+    {
+        Bytes b;
+        b.F32(0.08f).F32(0.15f).F32(88.0f).F32(0.25f).U32(0);
+        return b.U32(vertexCount).U32(triCount).U32(uvPresent).U32(srcPolyPresent);
+    }
+
+    Bytes OneTriangleBinary(uint32_t uvPresent, uint32_t srcPolyPresent)
+    {
+        Bytes b = BinaryHeader(3, 1, uvPresent, srcPolyPresent);
+        b.F32(0).F32(0).F32(0).F32(4).F32(0).F32(0).F32(2).F32(2).F32(0);
+        return b.U32(0).U32(1).U32(2);
+    }
+
+    // One cell of the grid: margin 0.25, cell 0.5, scale 0.125.
+    std::string OneTriangleUVs()
+    {
+        Bytes b;
+        return b.F32(0.25f).F32(0.25f).F32(0.75f).F32(0.25f).F32(0.5f).F32(0.5f).data;
+    }
+
+    const char* const kTwoTriangleObj =
+        "# two charts\n"
+        "o sample\n"
+        "v 0 0 0\nv 4 0 0\nv 2 2 0\nv 2 2 1\nv 0 0 1\nv 0 4 1\n"
+        "vt 0.5 0.5\nvt 0.25 0.75\n"
+        "vn 0 0 1\n"
+        "s off\n"
+        "f 1/1/1 2/1/1 3/1/1\n"
+        "f 5/2/1 6/2/1 4/2/1 1/1/1\n";
+
+    struct ChartBakeFixture
+    {
+        std::string dir;
+
+        ChartBakeFixture()
+        {
+            char pattern[] = "/tmp/chartbake-e2e-XXXXXX";
+            dir = mkdtemp(pattern);
+        }
+        ~ChartBakeFixture() { std::filesystem::remove_all(dir); }
+
+        std::string PathOf(const std::string& name) const { return dir + "/" + name; }
+        void Write(const std::string& name, const std::string& bytes) const
+        {
+            std::ofstream(PathOf(name), std::ios::binary) << bytes;
+        }
+        std::string Read(const std::string& name) const
+        {
+            std::ifstream in(PathOf(name), std::ios::binary);
+            std::ostringstream text;
+            text << in.rdbuf();
+            return text.str();
+        }
+        bool Exists(const std::string& name) const { return std::filesystem::exists(PathOf(name)); }
+        void CopyFromBin(const std::string& file, const std::string& as) const
+        {
+            std::filesystem::copy_file(kBinDir + "/" + file, PathOf(as));
+        }
+
+        Testing::ChildResult Run(std::vector<std::string> args, const std::vector<std::string>& env = {},
+                                 const std::string& program = kBinDir + "/ChartBake") const
+        {
+            args.insert(args.begin(), program);
+            return Testing::RunProgram(args, dir, env);
+        }
+        // A copy of ChartBake in the directory itself, with no libraries beside it.
+        Testing::ChildResult RunLoneCopy(const std::vector<std::string>& args) const
+        {
+            if (!Exists("ChartBake"))
+            {
+                CopyFromBin("ChartBake", "ChartBake");
+                std::filesystem::permissions(PathOf("ChartBake"), std::filesystem::perms::owner_all);
+            }
+            return Run(args, {}, PathOf("ChartBake"));
+        }
+    };
+
+    bool Contains(const std::string& text, const std::string& part) { return text.find(part) != std::string::npos; }
+
+    const std::string kUsage = "usage:\nChartBake [-obj] <input_file> <output_file>\n";
+}
+
+INTEGRATION_TEST_SUITE(ChartBake)
+{
+    TEST_FIXTURE(ChartBakeFixture, CommandLine_UsageForms_PrintUsageAndExit1)
+    {
+        const std::vector<std::vector<std::string>> usageForms = {
+            {}, {"mesh.bin"}, {"-obj"}, {"-obj", "mesh.obj"}, {"-obj", "mesh.obj", "out.obj", "extra"},
+            {"mesh.bin", "out.bin", "extra"}, {"-runNativeTestsX"}};
+        Write("mesh.obj", kTwoTriangleObj);
+        Write("mesh.bin", OneTriangleBinary(0, 0).data);
+        for (const auto& args : usageForms)
+        {
+            Testing::ChildResult r = Run(args);
+            CHECK(r.exited);
+            CHECK_EQUAL(1, r.exitStatus);
+            CHECK_EQUAL(kUsage, r.out);
+        }
+        CHECK(!Exists("out.obj"));
+        CHECK(!Exists("out.bin"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, CommandLine_BothLibrariesLoadBeforeTheArgumentsAreRead)
+    {
+        // Copies in the working directory are found first and announce their load.
+        CopyFromBin("Tessary.dll", "Tessary.dll");
+        CopyFromBin("Unwrap.dll", "Unwrap.dll");
+        Testing::ChildResult r = Run({}, {std::string(kBehaviour) + "announce"});
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK_EQUAL("Tessary.dll loaded\nUnwrap.dll loaded\n" + kUsage, r.out);
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, Unwrap_LibraryRunsWithRoundTowardZeroAndDenormalsKept)
+    {
+        Write("mesh.bin", OneTriangleBinary(0, 0).data);
+        Testing::ChildResult r = Run({"mesh.bin", "out.bin"}, {std::string(kBehaviour) + "unwrap-report-fp"});
+        CHECK_EQUAL(0, r.exitStatus);
+        CHECK_EQUAL("rounding toward zero, denormals kept\n", r.out);
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, CommandLine_WithoutLibraries_UsageStillWorks)
+    {
+        Testing::ChildResult r = RunLoneCopy({"-obj"});
+        CHECK(r.exited);
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK_EQUAL(kUsage, r.out);
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, CommandLine_NearMissesOfTheTestSwitch_AreBinaryInputPaths)
+    {
+        for (const std::string name : {"-runNativeTestsX", "-runNativeTest"})
+        {
+            Write(name, OneTriangleBinary(0, 0).data);
+            Testing::ChildResult r = Run({name, "out.bin"});
+            CHECK_EQUAL(0, r.exitStatus);
+            CHECK_EQUAL("", r.out);
+            CHECK_EQUAL(OneTriangleUVs(), Read("out.bin"));
+        }
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, Obj_TwoTriangles_WrittenByteForByte)
+    {
+        Write("mesh.obj", kTwoTriangleObj);
+        Testing::ChildResult r = Run({"-obj", "mesh.obj", "out.obj"});
+        CHECK_EQUAL(0, r.exitStatus);
+        CHECK_EQUAL("", r.out + r.err);
+        // Default margin 1/256; two cells of 253/512 side, scale 253/2048.
+        const std::string expected =
+            "g unwrap_out\n# vertices 6\n# triangles 2\n\n"
+            "v 0.000000 0.000000 0.000000\nv 4.000000 0.000000 0.000000\nv 2.000000 2.000000 0.000000\n"
+            "v 2.000000 2.000000 1.000000\nv 0.000000 0.000000 1.000000\nv 0.000000 4.000000 1.000000\n\n"
+            "vt 0.003906 0.003906\nvt 0.498047 0.003906\nvt 0.250977 0.250977\n"
+            "vt 0.501953 0.003906\nvt 0.996094 0.003906\nvt 0.749023 0.250977\n\n"
+            "f 1/1 2/2 3/3\nf 5/4 6/5 4/6\n";
+        CHECK_EQUAL(expected, Read("out.obj"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, Binary_OptionalBlocks_ReadInOrderAndOnlyUVsWritten)
+    {
+        Bytes both = OneTriangleBinary(2, 0xFFFFFFFFu);
+        both.F32(0).F32(0).F32(1).F32(0).F32(0).F32(1).U32(7);
+        Bytes polyOnly = OneTriangleBinary(0, 1);
+        polyOnly.U32(7);
+        const std::vector<std::string> inputs = {OneTriangleBinary(0, 0).data, both.data, polyOnly.data};
+        for (const std::string& input : inputs)
+        {
+            Write("mesh.bin", input);
+            Testing::ChildResult r = Run({"mesh.bin", "out.bin"});
+            CHECK_EQUAL(0, r.exitStatus);
+            CHECK_EQUAL(OneTriangleUVs(), Read("out.bin"));
+        }
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, Binary_PackMarginFromTheFileIsPassedOn)
+    {
+        // packMargin 0 and the same triangle: one cell filling the square, scale 0.25.
+        Bytes b;
+        b.F32(0.08f).F32(0.15f).F32(88.0f).F32(0.0f).U32(0).U32(3).U32(1).U32(0).U32(0);
+        b.F32(0).F32(0).F32(0).F32(4).F32(0).F32(0).F32(2).F32(2).F32(0).U32(0).U32(1).U32(2);
+        Write("mesh.bin", b.data);
+        CHECK_EQUAL(0, Run({"mesh.bin", "out.bin"}).exitStatus);
+        Bytes expected;
+        CHECK_EQUAL(expected.F32(0).F32(0).F32(1).F32(0).F32(0.5f).F32(0.5f).data, Read("out.bin"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, ErrorBuffer_PrintedVerbatimWhetherOrNotTheUnwrapSucceeds)
+    {
+        Write("mesh.bin", OneTriangleBinary(0, 0).data);
+        Testing::ChildResult warned = Run({"mesh.bin", "out.bin"}, {std::string(kBehaviour) + "unwrap-warn"});
+        CHECK_EQUAL(0, warned.exitStatus);
+        CHECK_EQUAL("GenerateSecondaryUVSet: warning as CHARTBAKE_LIBRARY_BEHAVIOUR asks\n", warned.out);
+        CHECK_EQUAL(OneTriangleUVs(), Read("out.bin"));
+
+        Testing::ChildResult failed = Run({"mesh.bin", "failed.bin"}, {std::string(kBehaviour) + "unwrap-fail"});
+        CHECK_EQUAL(1, failed.exitStatus);
+        CHECK_EQUAL("GenerateSecondaryUVSet: failing as CHARTBAKE_LIBRARY_BEHAVIOUR asks", failed.out);
+        CHECK(!Exists("failed.bin"));
+
+        // A buffer filled to its last byte, with no terminator: exactly 1,024 characters printed.
+        Testing::ChildResult full = Run({"mesh.bin", "full.bin"}, {std::string(kBehaviour) + "unwrap-fill"});
+        CHECK_EQUAL(0, full.exitStatus);
+        CHECK_EQUAL(std::string(1023, 'W') + "Z", full.out);
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, ErrorBuffer_LibraryRejectsABadIndexOrAnEmptyMesh)
+    {
+        Bytes b = BinaryHeader(3, 1, 0, 0);
+        b.F32(0).F32(0).F32(0).F32(4).F32(0).F32(0).F32(2).F32(2).F32(0).U32(0).U32(7).U32(2);
+        Write("mesh.bin", b.data);
+        Testing::ChildResult r = Run({"mesh.bin", "out.bin"});
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK_EQUAL("GenerateSecondaryUVSet: triangle 0 uses vertex 7, but the mesh has 3 vertices", r.out);
+        CHECK(!Exists("out.bin"));
+
+        Write("empty.bin", BinaryHeader(0, 0, 0, 0).data);
+        Testing::ChildResult empty = Run({"empty.bin", "out.bin"});
+        CHECK_EQUAL(1, empty.exitStatus);
+        CHECK_EQUAL("GenerateSecondaryUVSet: the mesh has no triangles", empty.out);
+        CHECK(!Exists("out.bin"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, NativeTests_AllPass_Exit0)
+    {
+        Testing::ChildResult r = Run({"-runNativeTests", "ignored", "-obj"});
+        CHECK_EQUAL(0, r.exitStatus);
+        CHECK(Contains(r.out, "Ran 15 tests with 0 failures in "));
+        for (const char* name : {"[Tessary]  NonManifoldFixer ", "MathBasic ", "InternalCollapseEdge ",
+                                 "SimplePatchGenerate ", "UnwrapWithDegenerateTriangles ", "UnwrapDontSplitRects "})
+            CHECK(Contains(r.out, name));
+        CHECK(!Contains(r.out, "FAIL"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, NativeTests_TwoFailingAndOneCrashing_Exit3AndTheRunGoesOn)
+    {
+        Testing::ChildResult r = Run({"-runNativeTests"}, {std::string(kBehaviour) +
+                                                          "fail:Tessary_TestLog,fail:Tessary_TestHashTab,crash:Tessary_TestArray"});
+        CHECK(r.exited);
+        CHECK_EQUAL(3, r.exitStatus);
+        const std::string notTrue = "\tCHECK FAILURE: Expected values to be the same, but they were not\n"
+                                    "\tExpected: 1\n\t  Actual: 0\n (Editor/Tools/Unwrap/source/CLTool/CLTool.cpp:";
+        CHECK(Contains(r.out, "MathBasic                        FAIL!!!!\n" + notTrue + "307)\n"));
+        CHECK(Contains(r.out, "HashTab                          FAIL!!!!\n" + notTrue + "325)\n"));
+        CHECK(Contains(r.out, "[Tessary]  Array                            FAIL!!!!\n"));
+        CHECK(Contains(r.out, "(Editor/Tools/Unwrap/source/CLTool/CLTool.cpp:315)\n"));
+        CHECK(Contains(r.out, "[Tessary]  BlobArray                        PASS("));
+        CHECK(Contains(r.out, "Ran 15 tests with 3 failures in "));
+        CHECK(Contains(r.out, "\tFAILED: MathBasic [Tessary]\n\tFAILED: Array [Tessary]\n\tFAILED: HashTab [Tessary]\n"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, NativeTests_MathBasicReportsEachOfItsFiveExports)
+    {
+        Testing::ChildResult r = Run({"-runNativeTests"}, {std::string(kBehaviour) +
+                                                          "fail:Tessary_TestMathBasic,fail:Tessary_TestSparseMatrix"});
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK(Contains(r.out, "CLTool.cpp:305)\n"));
+        CHECK(Contains(r.out, "CLTool.cpp:309)\n"));
+        CHECK(!Contains(r.out, "CLTool.cpp:306)"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, NativeTests_MissingLibraries_FailTheTestsThatNeedThem)
+    {
+        Testing::ChildResult none = RunLoneCopy({"-runNativeTests"});
+        CHECK_EQUAL(15, none.exitStatus);
+        CHECK(Contains(none.out, "Tessary_TestArray is unavailable: Tessary.dll could not be loaded from Tessary.dll "
+                                 "(Failed to load DLL: could not open file) (Editor/Tools/Unwrap/source/CLTool/CLTool.cpp:317)"));
+
+        CopyFromBin("Tessary.dll", "Tessary.dll");
+        Testing::ChildResult onlyTessary = RunLoneCopy({"-runNativeTests"});
+        CHECK_EQUAL(2, onlyTessary.exitStatus);
+        CHECK(Contains(onlyTessary.out, "Unwrap_TestUnwrapDontSplitRects is unavailable: Unwrap.dll could not be loaded"));
+        CHECK(Contains(onlyTessary.out, "\tFAILED: UnwrapWithDegenerateTriangles [Tessary]\n\tFAILED: UnwrapDontSplitRects [Tessary]\n"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, BadInput_UnopenableInputOrUncreatableOutput)
+    {
+        Testing::ChildResult missingObj = Run({"-obj", "absent.obj", "out.obj"});
+        CHECK_EQUAL(1, missingObj.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot open input file absent.obj: No such file or directory\n", missingObj.err);
+        CHECK_EQUAL(1, Run({"absent.bin", "out.bin"}).exitStatus);
+
+        Write("mesh.bin", OneTriangleBinary(0, 0).data);
+        Testing::ChildResult noDir = Run({"mesh.bin", "no/such/dir/out.bin"});
+        CHECK_EQUAL(1, noDir.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot create output file no/such/dir/out.bin: No such file or directory\n", noDir.err);
+        CHECK(!Exists("out.obj"));
+        CHECK(!Exists("out.bin"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, BadInput_TruncatedOrOverflowingBinary)
+    {
+        std::string whole = OneTriangleBinary(0, 0).data;
+        // Cut inside the parameters, inside the vertex block, inside the triangle block; a present
+        // UV block (presence word 2) that is missing altogether.
+        const std::vector<std::string> truncated = {whole.substr(0, 10), whole.substr(0, 40), whole.substr(0, whole.size() - 1),
+                                                    OneTriangleBinary(2, 0).data};
+        for (const std::string& input : truncated)
+        {
+            Write("mesh.bin", input);
+            Testing::ChildResult r = Run({"mesh.bin", "out.bin"});
+            CHECK_EQUAL(1, r.exitStatus);
+            CHECK(Contains(r.err, "ChartBake: input file mesh.bin is truncated: the "));
+        }
+        Write("huge.bin", BinaryHeader(0x60000000u, 1, 0, 0).data);
+        Testing::ChildResult huge = Run({"huge.bin", "out.bin"});
+        CHECK_EQUAL(1, huge.exitStatus);
+        CHECK(Contains(huge.err, "has counts too large to process: 1610612736 vertices"));
+        CHECK(!Exists("out.bin"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, BadInput_ObjFacesNameTheirLine)
+    {
+        struct Case { const char* text; const char* error; };
+        const Case cases[] = {
+            {"v 0 0 0\nv 1 0 0\nv 0 1 0\nvt 0 0\nf 1/1 2/1 3/1\n",
+             "ChartBake: mesh.obj:5: face corners must have the form vertex/uv/normal (three of them)\n"},
+            {"v 0 0 0\nv 1 0 0\nv 0 1 0\nvt 0 0\n\nf 1/1/1 2/1/1 4/1/1\n",
+             "ChartBake: mesh.obj:6: face refers to vertex 4, which does not exist (the file has 3 vertices and 1 uvs)\n"},
+            {"v 0 0 0\nv 1 0 0\nv 0 1 0\nf 1/1/1 2/1/1 3/1/1\n",
+             "ChartBake: mesh.obj:4: face refers to uv 1, which does not exist (the file has 3 vertices and 0 uvs)\n"},
+            {"v 0 0 0\nv 1 0 0\nv 0 1 0\nvt 0 0\nf 0/1/1 2/1/1 3/1/1\n",
+             "ChartBake: mesh.obj:5: face refers to vertex 0, which does not exist (the file has 3 vertices and 1 uvs)\n"},
+        };
+        for (const Case& c : cases)
+        {
+            Write("mesh.obj", c.text);
+            Testing::ChildResult r = Run({"-obj", "mesh.obj", "out.obj"});
+            CHECK_EQUAL(1, r.exitStatus);
+            CHECK_EQUAL(c.error, r.err);
+            CHECK(!Exists("out.obj"));
+        }
+        // Faces may refer to positions and UVs defined further down.
+        Write("late.obj", "f 1/1/1 2/1/1 3/1/1\nv 0 0 0\nv 4 0 0\nv 2 2 0\nvt 0 0\n");
+        CHECK_EQUAL(0, Run({"-obj", "late.obj", "out.obj"}).exitStatus);
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, BadInput_MissingLibraryOrExportForTheUnwrap)
+    {
+        Write("mesh.bin", OneTriangleBinary(0, 0).data);
+        Testing::ChildResult none = RunLoneCopy({"mesh.bin", "out.bin"});
+        CHECK_EQUAL(1, none.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot unwrap: GenerateSecondaryUVSet is unavailable: Unwrap.dll could not be loaded "
+                    "from Unwrap.dll (Failed to load DLL: could not open file)\n",
+                    none.err);
+
+        // Each library in the working directory stands in for the other: neither has the exports.
+        CopyFromBin("Tessary.dll", "Unwrap.dll");
+        Testing::ChildResult noExport = Run({"mesh.bin", "out.bin"});
+        CHECK_EQUAL(1, noExport.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot unwrap: Unwrap.dll has no export GenerateSecondaryUVSet\n", noExport.err);
+
+        std::filesystem::remove(PathOf("Unwrap.dll"));
+        CopyFromBin("Unwrap.dll", "Tessary.dll");
+        Testing::ChildResult noService = Run({"mesh.bin", "out.bin"});
+        CHECK_EQUAL(1, noService.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot unwrap: Tessary.dll has no export Tessary_Allocate\n", noService.err);
+        CHECK(!Exists("out.bin"));
+    }
+}

@@ -1,0 +1,105 @@
+#include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
+
+#include "Editor/Tools/Unwrap/source/CLTool/MeshFileStream.h"
+
+#include <cstdlib>
+#include <cstring>
+#include <vector>
+
+UnwrapParam DefaultUnwrapParam()
+{
+    return UnwrapParam{0.08f, 0.15f, 88.0f, 1.0f / 256.0f, 0};
+}
+
+namespace
+{
+    // The fixed part of the raw binary file: parameters, counts, presence words.
+    struct BinaryHeader
+    {
+        uint32_t vertexCount = 0;
+        uint32_t triCount = 0;
+        uint32_t uvPresent = 0;
+        uint32_t srcPolyPresent = 0;
+    };
+
+    // Counts are turned into element counts in 32 bits (3V, 3T, 6T) and into int32 for the
+    // library; counts beyond either are refused rather than wrapped.
+    MeshFileError CheckCounts(const char* path, const BinaryHeader& header)
+    {
+        const uint64_t kMaxInt32 = 0x7FFFFFFF;
+        if ((uint64_t)header.vertexCount * 3 > kMaxInt32 || (uint64_t)header.triCount * 6 > kMaxInt32)
+            return std::string("input file ") + path + " has counts too large to process: " +
+                   std::to_string(header.vertexCount) + " vertices, " + std::to_string(header.triCount) + " triangles";
+        return "";
+    }
+
+    template <typename T>
+    MeshFileError ReadBlock(MeshFileStream& in, T** block, uint64_t elements, const char* what)
+    {
+        uint64_t bytes = elements * sizeof(T);
+        if (bytes > in.Remaining())
+            return in.Read(nullptr, bytes, what);   // reports the truncation
+        *block = (T*)std::malloc(bytes ? bytes : 1);
+        if (!*block)
+            return std::string("out of memory reading ") + in.Path();
+        return in.Read(*block, bytes, what);
+    }
+}
+
+MeshFileError LoadFromHalvorBinary(const char* path, UnwrapParam* param, uint32_t* vertexCount, uint32_t* triCount,
+                                   float** vertex, float** uv, uint32_t** tri, uint32_t** srcPoly)
+{
+    MeshFileStream in;
+    BinaryHeader header;
+    MeshFileError error = in.OpenForReading(path, "rb");
+    if (error.empty()) error = in.Read(param, sizeof(UnwrapParam), "parameter block");
+    if (error.empty()) error = in.Read(&header.vertexCount, 4, "vertex count");
+    if (error.empty()) error = in.Read(&header.triCount, 4, "triangle count");
+    if (!error.empty())
+        return error;
+    // A file that ends before a presence word leaves it 0: the word is optional, not truncated.
+    in.ReadOptionalWord(&header.uvPresent);
+    in.ReadOptionalWord(&header.srcPolyPresent);
+    error = CheckCounts(path, header);
+    if (!error.empty())
+        return error;
+    *vertexCount = header.vertexCount;
+    *triCount = header.triCount;
+    *uv = nullptr;
+    *srcPoly = nullptr;
+    error = ReadBlock(in, vertex, 3ull * header.vertexCount, "vertex block");
+    if (error.empty()) error = ReadBlock(in, tri, 3ull * header.triCount, "triangle block");
+    if (error.empty() && header.uvPresent) error = ReadBlock(in, uv, 6ull * header.triCount, "UV block");
+    if (error.empty() && header.srcPolyPresent) error = ReadBlock(in, srcPoly, header.triCount, "source polygon block");
+    return error;
+}
+
+MeshFileError SaveToHalvorBinary(const char* path, uint32_t, uint32_t triCount, const float*, const float* uv, const uint32_t*)
+{
+    MeshFileStream out;
+    MeshFileError error = out.OpenForWriting(path, "wb");
+    if (error.empty())
+        error = out.Write(uv, (size_t)triCount * 24);
+    std::string closed = out.Close();
+    return error.empty() ? closed : error;
+}
+
+MeshFileError SaveToObj(const char* path, uint32_t vertexCount, uint32_t triCount, const float* vertex, const float* uv,
+                        const uint32_t* tri)
+{
+    MeshFileStream out;
+    MeshFileError error = out.OpenForWriting(path, "wt");
+    if (!error.empty())
+        return error;
+    out.Print("g unwrap_out\n# vertices %u\n# triangles %u\n\n", vertexCount, triCount);
+    for (uint32_t v = 0; v < vertexCount; ++v)
+        out.Print("v %f %f %f\n", (double)vertex[3 * v], (double)vertex[3 * v + 1], (double)vertex[3 * v + 2]);
+    out.Print("\n");
+    for (uint64_t corner = 0; corner < 3ull * triCount; ++corner)
+        out.Print("vt %f %f\n", (double)uv[2 * corner], (double)uv[2 * corner + 1]);
+    out.Print("\n");
+    for (uint32_t t = 0; t < triCount; ++t)
+        out.Print("f %u/%u %u/%u %u/%u\n", tri[3 * t] + 1, 3 * t + 1, tri[3 * t + 1] + 1, 3 * t + 2, tri[3 * t + 2] + 1,
+                  3 * t + 3);
+    return out.Close();
+}

@@ -1,0 +1,24 @@
+#pragma once
+// Wall-clock time per phase of one run (loading the libraries, reading, unwrapping, writing),
+// printed to standard error at the end when the environment variable CHARTBAKE_TIMINGS is set
+// to a non-empty value. Used by the benchmark; silent otherwise.
+
+#include <chrono>
+
+class PhaseTimings
+{
+public:
+    enum Phase { kLoadLibraries, kRead, kUnwrap, kWrite, kPhaseCount };
+
+    PhaseTimings();
+    // Ends the phase running since the last mark (or since construction) and books it to `phase`.
+    void Mark(Phase phase);
+    // Prints "ChartBake timings: load libraries %.1f ms, read ..." when enabled.
+    void Report() const;
+
+private:
+    std::chrono::steady_clock::time_point m_Last;
+    double m_Milliseconds[kPhaseCount] = {};
+};
+
+PhaseTimings& GetPhaseTimings();

@@ -1,0 +1,118 @@
+// GenerateSecondaryUVSet: checks the mesh, flattens every triangle into a chart of its own and
+// packs the charts into a grid (ChartLayout). Scratch memory comes from Tessary.dll's allocator.
+#include "../Tessary/TessaryApi.h"
+#include "ChartLayout.h"
+#include "DllRuntime.h"
+#include "LibraryBehaviour.h"
+#include "UnwrapApi.h"
+#include "WinImports.h"
+
+namespace
+{
+    // Writes the reason into the caller's buffer and answers false.
+    bool Fail(char* buffer, uint32_t size, const char* text)
+    {
+        if (buffer && size)
+            sprintf_s(buffer, size, "GenerateSecondaryUVSet: %s", text);
+        return false;
+    }
+
+    bool CheckMesh(const float* vertex, int32_t vertexCount, const uint32_t* tri, int32_t triCount, const float* outUV,
+                   const UnwrapParam& param, char* buffer, uint32_t size)
+    {
+        char reason[200];
+        if (triCount <= 0)
+            return Fail(buffer, size, "the mesh has no triangles");
+        if (vertexCount <= 0 || !vertex || !tri || !outUV)
+            return Fail(buffer, size, "the vertex, triangle or output array is missing");
+        if ((uint64_t)triCount * 24 > 0xFFFFFFFFull)
+            return Fail(buffer, size, "too many triangles for the scratch memory");
+        if (!(param.packMargin >= 0 && param.packMargin < 0.5f))
+            return Fail(buffer, size, "packMargin must lie in [0, 0.5)");
+        for (int32_t i = 0; i < 3 * triCount; ++i)
+            if (tri[i] >= (uint32_t)vertexCount)
+            {
+                sprintf_s(reason, sizeof reason, "triangle %d uses vertex %u, but the mesh has %d vertices", i / 3, tri[i],
+                          vertexCount);
+                return Fail(buffer, size, reason);
+            }
+        for (int32_t i = 0; i < 3 * vertexCount; ++i)
+            if (!_finite(vertex[i]))
+            {
+                sprintf_s(reason, sizeof reason, "vertex %d has a coordinate that is not a finite number", i / 3);
+                return Fail(buffer, size, reason);
+            }
+        return true;
+    }
+
+    bool Layout(const float* vertex, const uint32_t* tri, uint32_t triCount, float* outUV, float packMargin, char* buffer,
+                uint32_t size)
+    {
+        float* flat = (float*)Tessary_Allocate(triCount * 24);
+        if (!flat)
+            return Fail(buffer, size, "out of memory");
+        float extent = 0;
+        for (uint32_t t = 0; t < triCount; ++t)
+        {
+            const uint32_t* c = tri + 3 * t;
+            float side = FlattenTriangle(vertex + 3 * c[0], vertex + 3 * c[1], vertex + 3 * c[2], flat + 6 * t);
+            extent = side > extent ? side : extent;
+        }
+        GridLayout grid = MakeGridLayout(triCount, packMargin);
+        float scale = extent > 0 ? grid.cell / extent : 0;
+        for (uint32_t t = 0; t < triCount; ++t)
+            PlaceChart(grid, t, flat + 6 * t, scale, outUV + 6 * t);
+        Tessary_Deallocate(flat);
+        return true;
+    }
+
+    // Observes the SSE state the library is called with: the rounding of 1/3 and whether half the
+    // smallest normal float survives as a denormal.
+    void ReportFloatingPointState(char* buffer, uint32_t size)
+    {
+        volatile float one = 1.0f, three = 3.0f, smallest = 1.17549435e-38f, minusOne = -1.0f;
+        float third = one / three, minusThird = minusOne / three;
+        uint32_t bits, minusBits;
+        memcpy(&bits, &third, 4);
+        memcpy(&minusBits, &minusThird, 4);
+        // Exact 1/3 lies between 0x3EAAAAAA and 0x3EAAAAAB (nearer the latter).
+        const char* rounding = bits == 0x3EAAAAABu ? (minusBits == 0xBEAAAAABu ? "to nearest" : "up")
+                                                   : (minusBits == 0xBEAAAAAAu ? "toward zero" : "down");
+        float half = smallest * 0.5f;
+        sprintf_s(buffer, size, "rounding %s, denormals %s\n", rounding, half != 0 ? "kept" : "flushed");
+    }
+
+    void FillWholeBuffer(char* buffer, uint32_t size)
+    {
+        memset(buffer, 'W', size);
+        if (size)
+            buffer[size - 1] = 'Z';
+    }
+}
+
+extern "C" bool GenerateSecondaryUVSet(const float* vertex, int32_t vertexCount, const float*, const uint32_t* tri,
+                                       const uint32_t*, int32_t triCount, float* outUV, const UnwrapParam& param,
+                                       char* errorBuffer, uint32_t errorBufferSize)
+{
+    if (BehaviourRequested("unwrap-fail"))
+        return Fail(errorBuffer, errorBufferSize, "failing as CHARTBAKE_LIBRARY_BEHAVIOUR asks");
+    if (!CheckMesh(vertex, vertexCount, tri, triCount, outUV, param, errorBuffer, errorBufferSize))
+        return false;
+    if (BehaviourRequested("unwrap-warn") && errorBuffer && errorBufferSize)
+        sprintf_s(errorBuffer, errorBufferSize, "GenerateSecondaryUVSet: warning as CHARTBAKE_LIBRARY_BEHAVIOUR asks\n");
+    if (BehaviourRequested("unwrap-report-fp") && errorBuffer && errorBufferSize)
+        ReportFloatingPointState(errorBuffer, errorBufferSize);
+    if (BehaviourRequested("unwrap-fill") && errorBuffer)
+        FillWholeBuffer(errorBuffer, errorBufferSize);
+    return Layout(vertex, tri, (uint32_t)triCount, outUV, param.packMargin, errorBuffer, errorBufferSize);
+}
+
+extern "C" BOOL DllMain(HMODULE, DWORD reason, void*)
+{
+    if (reason == 1)
+    {
+        RunGlobalConstructors();
+        AnnounceLoad("Unwrap.dll");
+    }
+    return 1;
+}
