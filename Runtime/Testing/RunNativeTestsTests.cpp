@@ -33,7 +33,9 @@ UNIT_TEST_SUITE(RunNativeTests)
         InnerTests inner;
         inner.Add("S", "Segv", [] { raise(SIGSEGV); });
         inner.Add("S", "NullWrite", [] {
-            int* volatile target = nullptr;
+            // Both the pointer and the store are volatile, so the optimiser can neither
+            // prove the pointer null nor drop the store as dead.
+            volatile int* volatile target = nullptr;
             *target = 1;
         });
         inner.Add("S", "Fpe", [] { raise(SIGFPE); });
