@@ -48,8 +48,9 @@ namespace
         FIXTURE_CHECK(EncodePointer(&object) == &object);
         FIXTURE_CHECK(DecodePointer(&object) == &object);
         Sleep(1000000);  // returns at once
+        // The exact host values are checked on the host side; here only that they are real ids.
         FIXTURE_CHECK(GetCurrentProcessId() != 0);
-        FIXTURE_CHECK(GetCurrentThreadId() == GetCurrentThreadId());
+        FIXTURE_CHECK(GetCurrentThreadId() != 0);
         return 0;
     }
 }

@@ -111,7 +111,7 @@ namespace
         }
     };
 
-    struct ConversionSpec
+    struct ConversionFields
     {
         int flags = 0;
         int min = 0;   // width
@@ -239,8 +239,10 @@ static void fmtfp(Output& out, double fvalue, int min, int max, int flags)
 {
     char sign = SignOf(fvalue < 0, flags);
     double ufvalue = fvalue < 0 ? -fvalue : fvalue;
-    if (max < 0)
-        max = 6;  // also for a negative precision taken from the argument list
+    // Only the "none given" value means the default; any other negative precision (from "*")
+    // is kept: no fraction digits, no point, and it widens the padding.
+    if (max == -1)
+        max = 6;
     if (max > kMaxFloatPrecision)
         max = kMaxFloatPrecision;
 
@@ -326,16 +328,16 @@ static void fmtstr(Output& out, const char* value, int flags, int min, int max)
 
 namespace
 {
-    void ConvertString(Output& out, const char* value, const ConversionSpec& spec)
+    void ConvertString(Output& out, const char* value, const ConversionFields& conv)
     {
         if (!value)
             value = "(NULL)";
-        int max = spec.max;
+        int max = conv.max;
         if (max == -1)
             max = static_cast<int>(strnlen(value, 0x7FFFFFFF));
-        if (spec.min > 0 && max >= 0 && spec.min > max)
-            max = spec.min;
-        fmtstr(out, value, spec.flags, spec.min, max);
+        if (conv.min > 0 && max >= 0 && conv.min > max)
+            max = conv.min;
+        fmtstr(out, value, conv.flags, conv.min, max);
     }
 
     void StoreCount(void* target, size_t currlen, int length)
@@ -372,26 +374,26 @@ namespace
     }
 
     // One conversion character; returns true when the next format character is to be skipped.
-    bool Convert(Output& out, WindowsArgList& args, char conversion, ConversionSpec& spec)
+    bool Convert(Output& out, WindowsArgList& args, char conversion, ConversionFields& conv)
     {
-        const int unsignedFlags = spec.flags | kFlagUnsigned;
+        const int unsignedFlags = conv.flags | kFlagUnsigned;
         switch (conversion)
         {
         case 'd':
-        case 'i': fmtint(out, SignedArgument(args, spec.length), 10, spec.min, spec.max, spec.flags); break;
-        case 'o': fmtint(out, UnsignedArgument(args, spec.length), 8, spec.min, spec.max, unsignedFlags); break;
-        case 'u': fmtint(out, UnsignedArgument(args, spec.length), 10, spec.min, spec.max, unsignedFlags); break;
-        case 'x': fmtint(out, UnsignedArgument(args, spec.length), 16, spec.min, spec.max, unsignedFlags); break;
-        case 'X': fmtint(out, UnsignedArgument(args, spec.length), 16, spec.min, spec.max, unsignedFlags | kFlagUpper); break;
+        case 'i': fmtint(out, SignedArgument(args, conv.length), 10, conv.min, conv.max, conv.flags); break;
+        case 'o': fmtint(out, UnsignedArgument(args, conv.length), 8, conv.min, conv.max, unsignedFlags); break;
+        case 'u': fmtint(out, UnsignedArgument(args, conv.length), 10, conv.min, conv.max, unsignedFlags); break;
+        case 'x': fmtint(out, UnsignedArgument(args, conv.length), 16, conv.min, conv.max, unsignedFlags); break;
+        case 'X': fmtint(out, UnsignedArgument(args, conv.length), 16, conv.min, conv.max, unsignedFlags | kFlagUpper); break;
         case 'f':
         case 'e':
-        case 'g': fmtfp(out, args.Double(), spec.min, spec.max, spec.flags); break;
+        case 'g': fmtfp(out, args.Double(), conv.min, conv.max, conv.flags); break;
         case 'E':
-        case 'G': fmtfp(out, args.Double(), spec.min, spec.max, spec.flags | kFlagUpper); break;
+        case 'G': fmtfp(out, args.Double(), conv.min, conv.max, conv.flags | kFlagUpper); break;
         case 'c': out.PutCharArgument(args); break;
-        case 's': ConvertString(out, static_cast<const char*>(args.Pointer()), spec); break;
-        case 'p': fmtint(out, args.Int64(), 16, spec.min, spec.max, spec.flags); break;
-        case 'n': StoreCount(args.Pointer(), out.currlen, spec.length); break;
+        case 's': ConvertString(out, static_cast<const char*>(args.Pointer()), conv); break;
+        case 'p': fmtint(out, args.Int64(), 16, conv.min, conv.max, conv.flags); break;
+        case 'n': StoreCount(args.Pointer(), out.currlen, conv.length); break;
         case '%': out.Put('%'); break;
         case 'w': return true;
         default: break;
@@ -424,7 +426,7 @@ namespace
         const char* format = nullptr;
         char ch = 0;
         ParserState state = kStateDefault;
-        ConversionSpec spec;
+        ConversionFields conv;
 
         void Next() { ch = *format++; }
 
@@ -432,7 +434,7 @@ namespace
         {
             if (int flag = FlagOf(ch))
             {
-                spec.flags |= flag;
+                conv.flags |= flag;
                 Next();
             }
             else
@@ -443,12 +445,12 @@ namespace
         {
             if (IsDigit(ch))
             {
-                spec.min = AppendDigit(spec.min, ch);
+                conv.min = AppendDigit(conv.min, ch);
                 Next();
             }
             else if (ch == '*')
             {
-                spec.min = args.Int32();  // a negative width means no padding
+                conv.min = args.Int32();  // a negative width means no padding
                 Next();
                 state = kStateDot;
             }
@@ -471,14 +473,14 @@ namespace
         {
             if (IsDigit(ch))
             {
-                if (spec.max < 0)
-                    spec.max = 0;
-                spec.max = AppendDigit(spec.max, ch);
+                if (conv.max < 0)
+                    conv.max = 0;
+                conv.max = AppendDigit(conv.max, ch);
                 Next();
             }
             else if (ch == '*')
             {
-                spec.max = args.Int32();
+                conv.max = args.Int32();
                 Next();
                 state = kStateLength;
             }
@@ -490,19 +492,19 @@ namespace
         {
             switch (ch)
             {
-            case 'h': spec.length = kLengthShort; Next(); break;
+            case 'h': conv.length = kLengthShort; Next(); break;
             case 'l':
-                spec.length = kLengthLong;
+                conv.length = kLengthLong;
                 Next();
                 if (ch == 'l')
                 {
-                    spec.length = kLengthLongLong;
+                    conv.length = kLengthLongLong;
                     Next();
                 }
                 break;
-            case 'L': spec.length = kLengthLongDouble; Next(); break;
-            case 'z': spec.length = kLengthSize; Next(); break;
-            case 'j': spec.length = kLengthMax; Next(); break;
+            case 'L': conv.length = kLengthLongDouble; Next(); break;
+            case 'z': conv.length = kLengthSize; Next(); break;
+            case 'j': conv.length = kLengthMax; Next(); break;
             default: break;
             }
             state = kStateConversion;
@@ -511,11 +513,11 @@ namespace
         void Conversion(Output& out, WindowsArgList& args)
         {
             // "%w" skips the next character, but never the format's end.
-            if (Convert(out, args, ch, spec) && *format)
+            if (Convert(out, args, ch, conv) && *format)
                 ++format;
             Next();
             state = kStateDefault;
-            spec = ConversionSpec();
+            conv = ConversionFields();
         }
     };
 }

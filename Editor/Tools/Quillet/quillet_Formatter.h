@@ -5,6 +5,8 @@
 //
 // Deliberate differences from a C library's printf, which the DLLs were built against:
 // - "e", "E", "g", "G" print fixed-point like "f"; floating precision is at most 16.
+// - only a precision of -1 (none given) means 6 for floating output; another negative one from
+//   "*" prints no point and no fraction digits, and widens the padding by its magnitude;
 // - integers of 20 or more digits print only their lowest 19 digits;
 // - "%p" is a signed hexadecimal number without "0x";
 // - "%c" reads its argument only while the buffer has room, so once the buffer is full the next

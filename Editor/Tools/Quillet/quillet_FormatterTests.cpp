@@ -75,6 +75,8 @@ namespace
         {"%+.2f", {D(1.0)}, "+1.00"},
         {"%.20f", {D(1.0)}, "1.0000000000000000"},  // precision capped at 16
         {"%.*f", {2, D(3.14159)}, "3.14"},
+        {"%.*f", {uint64_t(-1), D(0.5)}, "0.500000"},  // -1 is "none given": the default 6
+        {"%5.*f|", {uint64_t(-2), D(2.5)}, "     3|"},  // other negatives: no point, wider padding
         {"%f", {D(123456789.125)}, "123456789.125000"},
         {"%.0f", {D(1e20)}, "100000000000000000000"},
         // Strings and characters.

@@ -23,7 +23,9 @@ namespace
     // Tab, line feed, vertical tab, form feed, carriage return, or a space in the low byte.
     QUILLET_WINAPI int isspace_impl(int c) { return LowByteAtMost(c - 9, 4) || static_cast<unsigned char>(c) == 0x20; }
 
-    QUILLET_WINAPI int isxdigit_impl(int c) { return isxdigit(c); }
+    // The host's class table covers -128 to 255 only; a value outside (a wide character, say) is
+    // no hex digit rather than a read far outside that table.
+    QUILLET_WINAPI int isxdigit_impl(int c) { return c >= -128 && c <= 255 ? isxdigit(c) : 0; }
     QUILLET_WINAPI int tolower_impl(int c) { return tolower(c); }
     QUILLET_WINAPI int toupper_impl(int c) { return toupper(c); }
 

@@ -53,6 +53,8 @@ UNIT_TEST_SUITE(QuilletImportsCRuntime)
         CHECK(CharTest("isxdigit", 'f') != 0);
         CHECK(CharTest("isxdigit", 'A') != 0);
         CHECK_EQUAL(0, CharTest("isxdigit", 'g'));
+        CHECK_EQUAL(0, CharTest("isxdigit", 0x7FFFFFFF));  // far outside the host's table
+        CHECK_EQUAL(0, CharTest("isxdigit", -0x7FFFFFFF));
         CHECK_EQUAL('a', CharTest("tolower", 'A'));
         CHECK_EQUAL('1', CharTest("tolower", '1'));
         CHECK_EQUAL('Z', CharTest("toupper", 'z'));

@@ -43,8 +43,8 @@ namespace
     QUILLET_WINAPI void* HeapAlloc_impl(HANDLE, DWORD dwFlags, unsigned long dwBytes)
     {
         void* block = malloc(dwBytes);
-        // Windows code never asks for zeroed memory it cannot get, so no null test here.
-        if (dwFlags & kHeapZeroMemory)
+        // A failed allocation is handed back as null, never cleared.
+        if (block && (dwFlags & kHeapZeroMemory))
             memset(block, 0, dwBytes);
         return block;
     }

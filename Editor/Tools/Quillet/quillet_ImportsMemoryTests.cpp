@@ -111,6 +111,8 @@ UNIT_TEST_SUITE(QuilletImportsMemory)
             allZero = allZero && block[i] == 0;
         CHECK(allZero);
         free(block);
+        // A size no host can give yields null, with nothing cleared.
+        CHECK(heapAlloc(reinterpret_cast<void*>(1), 0x8, uint64_t(1) << 62) == nullptr);
     }
 
     TEST(VirtualAlloc_CommitOfAnAddress_ReturnsItAndMapsNothing)

@@ -19,18 +19,21 @@ namespace
     }
 
     // Only UTF-8 is accepted. cchWideChar is not a bound: room for cbMultiByte units is assumed.
+    // A null output with size 0 (the Windows counting mode) is not offered: it passes the checks
+    // like any call, so an unsupported code page still stops the process, and then gets 0.
     QUILLET_WINAPI int MultiByteToWideChar_impl(UINT codePage, DWORD, const char* multiByteStr, int cbMultiByte,
                                                 unsigned short* wideCharStr, int cchWideChar)
     {
         if (!multiByteStr)
             return 0;
-        if (!wideCharStr)
-            return 0;  // also when cchWideChar is 0: no counting mode is offered
-        (void)cchWideChar;
+        if (!wideCharStr && cchWideChar != 0)
+            return 0;
         if (cbMultiByte < 0)
             cbMultiByte = static_cast<int>(strlen(multiByteStr)) + 1;  // the terminator is converted too
         if (codePage != kCodePageUtf8)
             UnsupportedCodePage(1091, "int MultiByteToWideChar_impl(UINT, DWORD, const char*, int, short unsigned int*, int)");
+        if (!wideCharStr)
+            return 0;
 
         int count = 0;
         return ConvertUTF8toUTF16(multiByteStr, cbMultiByte, wideCharStr, count) ? count : 0;
@@ -45,14 +48,14 @@ namespace
     }
 
     // Code page 0 keeps the low byte of every unit; UTF-8 is converted. cbMultiByte is not a bound.
+    // As above, a null output with size 0 passes the checks and then gets 0.
     QUILLET_WINAPI int WideCharToMultiByte_impl(UINT codePage, DWORD, const unsigned short* wideCharStr, int cchWideChar,
                                                 char* multiByteStr, int cbMultiByte, const char*, BOOL* usedDefaultChar)
     {
         if (!wideCharStr)
             return 0;
-        if (!multiByteStr)
-            return 0;  // also when cbMultiByte is 0: no counting mode is offered
-        (void)cbMultiByte;
+        if (!multiByteStr && cbMultiByte != 0)
+            return 0;
         if (cchWideChar < 0)
             cchWideChar = WideLengthWithTerminator(wideCharStr);
         if (usedDefaultChar)
@@ -60,12 +63,16 @@ namespace
 
         if (codePage == kCodePageDefault)
         {
+            if (!multiByteStr)
+                return 0;
             for (int i = 0; i < cchWideChar; ++i)
                 multiByteStr[i] = static_cast<char>(wideCharStr[i] & 0xFF);
             return cchWideChar;
         }
         if (codePage != kCodePageUtf8)
             UnsupportedCodePage(1145, "int WideCharToMultiByte_impl(UINT, DWORD, const short unsigned int*, int, char*, int, const char*, BOOL*)");
+        if (!multiByteStr)
+            return 0;
 
         int count = 0;
         return ConvertUTF16toUTF8(wideCharStr, cchWideChar, multiByteStr, count) ? count : 0;

@@ -95,25 +95,41 @@ UNIT_TEST_SUITE(QuilletImportsText)
         CHECK_EQUAL(0, toBytes(65001, 0, nullptr, -1, bytes, 32, nullptr, nullptr));
         CHECK_EQUAL(0, toBytes(65001, 0, text, -1, nullptr, 32, nullptr, nullptr));
         CHECK_EQUAL(kByteCanary, bytes[0]);
+        // No counting mode: a null output of size 0 passes the checks, so the flag is still
+        // cleared, and then gets 0 in either code page.
+        for (unsigned int codePage : {0u, 65001u})
+        {
+            int usedDefault = 7;
+            CHECK_EQUAL(0, toBytes(codePage, 0, text, -1, nullptr, 0, nullptr, &usedDefault));
+            CHECK_EQUAL(0, usedDefault);
+        }
     }
 
     TEST(UnsupportedCodePages_StopTheProcessWithTheAssertionReport)
     {
-        Testing::ChildResult toWide = Testing::RunInChildProcess([] {
-            uint16_t out[8];
-            reinterpret_cast<MultiByteToWideCharFn>(FindImport("MultiByteToWideChar"))(0, 0, "abc", -1, out, 8);
-        });
-        CHECK(AbortedWith(toWide, "Editor/Tools/Quillet/quillet_KnownImports:1091: "
-                                  "int MultiByteToWideChar_impl(UINT, DWORD, const char*, int, short unsigned int*, int): "
-                                  "Assertion `false' failed."));
+        const char* toWideReport = "Editor/Tools/Quillet/quillet_KnownImports:1091: "
+                                   "int MultiByteToWideChar_impl(UINT, DWORD, const char*, int, short unsigned int*, int): "
+                                   "Assertion `false' failed.";
+        const char* toBytesReport = "Editor/Tools/Quillet/quillet_KnownImports:1145: "
+                                    "int WideCharToMultiByte_impl(UINT, DWORD, const short unsigned int*, int, char*, int, const char*, BOOL*): "
+                                    "Assertion `false' failed.";
+        // With an output buffer, and with a null output of size 0, which is no way around the check.
+        for (bool withOutput : {true, false})
+        {
+            Testing::ChildResult toWide = Testing::RunInChildProcess([withOutput] {
+                uint16_t out[8];
+                reinterpret_cast<MultiByteToWideCharFn>(FindImport("MultiByteToWideChar"))(
+                    0, 0, "abc", -1, withOutput ? out : nullptr, withOutput ? 8 : 0);
+            });
+            CHECK(AbortedWith(toWide, toWideReport));
 
-        Testing::ChildResult toBytes = Testing::RunInChildProcess([] {
-            const uint16_t text[] = {'a', 0};
-            char out[8];
-            reinterpret_cast<WideCharToMultiByteFn>(FindImport("WideCharToMultiByte"))(1252, 0, text, -1, out, 8, nullptr, nullptr);
-        });
-        CHECK(AbortedWith(toBytes, "Editor/Tools/Quillet/quillet_KnownImports:1145: "
-                                   "int WideCharToMultiByte_impl(UINT, DWORD, const short unsigned int*, int, char*, int, const char*, BOOL*): "
-                                   "Assertion `false' failed."));
+            Testing::ChildResult toBytes = Testing::RunInChildProcess([withOutput] {
+                const uint16_t text[] = {'a', 0};
+                char out[8];
+                reinterpret_cast<WideCharToMultiByteFn>(FindImport("WideCharToMultiByte"))(
+                    1252, 0, text, -1, withOutput ? out : nullptr, withOutput ? 8 : 0, nullptr, nullptr);
+            });
+            CHECK(AbortedWith(toBytes, toBytesReport));
+        }
     }
 }

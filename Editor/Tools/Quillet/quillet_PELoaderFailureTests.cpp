@@ -148,6 +148,11 @@ UNIT_TEST_SUITE(PELoaderFailures)
         message = kNotRun;
         CHECK(PELoadLibrary(static_cast<const char*>(nullptr), nullptr, 0, &message) == nullptr);
         CHECK_EQUAL("Failed to load DLL: could not open file", message);
+        // A directory opens but reads as nothing a DLL could be; which step notices depends on
+        // the file system.
+        message = kNotRun;
+        CHECK(PELoadLibrary(CHARTBAKE_FIXTURE_DIR, nullptr, 0, &message) == nullptr);
+        CHECK(message != kNotRun && message != nullptr && strncmp(message, "Failed to load DLL: ", 20) == 0);
     }
 
     TEST(FileForm_PassesTheMemoryFormsMessageThrough)
