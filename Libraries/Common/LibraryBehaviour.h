@@ -6,7 +6,9 @@
 //   unwrap-warn         GenerateSecondaryUVSet writes a warning text, does its work and returns true
 //   unwrap-fill         like unwrap-warn, but fills the whole error buffer without a terminating zero
 //   unwrap-report-fp    like unwrap-warn, but the text tells the caller's floating-point state:
-//                       "rounding toward zero|to nearest|..., denormals kept|flushed\n"
+//                       "rounding toward zero|to nearest|..., denormals kept|flushed, control <hex>\n"
+//   unwrap-report-inputs  like unwrap-warn, but the text tells the parameters, counts and optional
+//                       arrays it was called with (Libraries/Unwrap/BehaviourReports.h)
 //   fail:<export>       the named test export returns false
 //   crash:<export>      the named test export writes through a null pointer
 // Unset or empty: everything does its real work.

@@ -1,6 +1,7 @@
 // GenerateSecondaryUVSet: checks the mesh, flattens every triangle into a chart of its own and
 // packs the charts into a grid (ChartLayout). Scratch memory comes from Tessary.dll's allocator.
 #include "../Tessary/TessaryApi.h"
+#include "BehaviourReports.h"
 #include "ChartLayout.h"
 #include "DllRuntime.h"
 #include "LibraryBehaviour.h"
@@ -21,8 +22,10 @@ namespace
                    const UnwrapParam& param, char* buffer, uint32_t size)
     {
         char reason[200];
-        if (triCount <= 0)
-            return Fail(buffer, size, "the mesh has no triangles");
+        if (triCount < 0)
+            return Fail(buffer, size, "the triangle count is negative");
+        if (triCount == 0)
+            return true;   // nothing to lay out
         if (vertexCount <= 0 || !vertex || !tri || !outUV)
             return Fail(buffer, size, "the vertex, triangle or output array is missing");
         if ((uint64_t)triCount * 24 > 0xFFFFFFFFull)
@@ -66,22 +69,6 @@ namespace
         return true;
     }
 
-    // Observes the SSE state the library is called with: the rounding of 1/3 and whether half the
-    // smallest normal float survives as a denormal.
-    void ReportFloatingPointState(char* buffer, uint32_t size)
-    {
-        volatile float one = 1.0f, three = 3.0f, smallest = 1.17549435e-38f, minusOne = -1.0f;
-        float third = one / three, minusThird = minusOne / three;
-        uint32_t bits, minusBits;
-        memcpy(&bits, &third, 4);
-        memcpy(&minusBits, &minusThird, 4);
-        // Exact 1/3 lies between 0x3EAAAAAA and 0x3EAAAAAB (nearer the latter).
-        const char* rounding = bits == 0x3EAAAAABu ? (minusBits == 0xBEAAAAABu ? "to nearest" : "up")
-                                                   : (minusBits == 0xBEAAAAAAu ? "toward zero" : "down");
-        float half = smallest * 0.5f;
-        sprintf_s(buffer, size, "rounding %s, denormals %s\n", rounding, half != 0 ? "kept" : "flushed");
-    }
-
     void FillWholeBuffer(char* buffer, uint32_t size)
     {
         memset(buffer, 'W', size);
@@ -90,8 +77,8 @@ namespace
     }
 }
 
-extern "C" bool GenerateSecondaryUVSet(const float* vertex, int32_t vertexCount, const float*, const uint32_t* tri,
-                                       const uint32_t*, int32_t triCount, float* outUV, const UnwrapParam& param,
+extern "C" bool GenerateSecondaryUVSet(const float* vertex, int32_t vertexCount, const float* triUV, const uint32_t* tri,
+                                       const uint32_t* srcPoly, int32_t triCount, float* outUV, const UnwrapParam& param,
                                        char* errorBuffer, uint32_t errorBufferSize)
 {
     if (BehaviourRequested("unwrap-fail"))
@@ -102,9 +89,11 @@ extern "C" bool GenerateSecondaryUVSet(const float* vertex, int32_t vertexCount,
         sprintf_s(errorBuffer, errorBufferSize, "GenerateSecondaryUVSet: warning as CHARTBAKE_LIBRARY_BEHAVIOUR asks\n");
     if (BehaviourRequested("unwrap-report-fp") && errorBuffer && errorBufferSize)
         ReportFloatingPointState(errorBuffer, errorBufferSize);
+    if (BehaviourRequested("unwrap-report-inputs") && errorBuffer && errorBufferSize)
+        ReportInputs(param, vertexCount, triCount, triUV, srcPoly, errorBuffer, errorBufferSize);
     if (BehaviourRequested("unwrap-fill") && errorBuffer)
         FillWholeBuffer(errorBuffer, errorBufferSize);
-    return Layout(vertex, tri, (uint32_t)triCount, outUV, param.packMargin, errorBuffer, errorBufferSize);
+    return triCount == 0 || Layout(vertex, tri, (uint32_t)triCount, outUV, param.packMargin, errorBuffer, errorBufferSize);
 }
 
 extern "C" BOOL DllMain(HMODULE, DWORD reason, void*)

@@ -93,24 +93,14 @@ int main(int argc, char** argv)
     InitializeLoggingFromEnvironment();
     GetPhaseTimings();   // the clock starts here
 
-    static PEKnownImport _KnownImports[kLibraryImportRows] = {
-        {"Tessary_Allocate", nullptr, 0}, {"Tessary_Deallocate", nullptr, 0},
-        {"Tessary_DestroyMeshDesc", nullptr, 0}, {"Tessary_CleanupGeometry", nullptr, 0},
-        {"Tessary_FitIntoCube", nullptr, 0}, {"Tessary_CreateProgressiveMesh", nullptr, 0},
-        {"Tessary_DestroyProgressiveMesh", nullptr, 0}, {"Tessary_PMGenerateGeometry", nullptr, 0},
-        {"Tessary_PMUpdateTriangles", nullptr, 0}, {"Tessary_PMUpdateTrianglesWithSourceInfo", nullptr, 0},
-        {"Tessary_PMSplitCount", nullptr, 0}, {"Tessary_LiftSegmentationFromLod", nullptr, 0},
-        {"Tessary_LiftSegmentationFromLodIter", nullptr, 0}, {"Tessary_TestMathBasic", nullptr, 0},
-        {"Tessary_TestTrigonometry", nullptr, 0}, {"Tessary_TestLog", nullptr, 0},
-        {"Tessary_TestMatrix4Invert", nullptr, 0}, {"Tessary_TestSparseMatrix", nullptr, 0},
-        {"Tessary_TestTriMapBasic", nullptr, 0}, {"Tessary_TestTriMapVertexIndex", nullptr, 0},
-        {"Tessary_TestCollapseEdgeBasic", nullptr, 0}, {"Tessary_TestSplitConnected", nullptr, 0},
-        {"Tessary_TestNonManifoldFixer", nullptr, 0}, {"Tessary_TestDegenerateRemoval", nullptr, 0},
-        {"Tessary_TestArray", nullptr, 0}, {"Tessary_TestBlobArray", nullptr, 0},
-        {"Tessary_TestHashTab", nullptr, 0}, {"Tessary_TestPriorityQueue", nullptr, 0},
-        {"Tessary_TestProgressiveMeshInternalCollapseEdge", nullptr, 0},
-        {"Tessary_TestSlidingWindowSimplePatchGenerate", nullptr, 0},
-    };
+    // Rows 1 to 13 name the service exports, rows 14 to 30 the test exports, in the order in which
+    // the export pointers are declared, so that FillKnownImports can copy them row by row.
+#define SERVICE_ROW(name, type) {#name, nullptr, 0},
+#define TEST_ROW(name) {#name, nullptr, 0},
+    static PEKnownImport _KnownImports[kLibraryImportRows] = {TESSARY_SERVICE_EXPORTS(SERVICE_ROW)
+                                                                   TESSARY_TEST_EXPORTS(TEST_ROW)};
+#undef SERVICE_ROW
+#undef TEST_ROW
 
     _TessaryDll = LoadLibraryNamed("Tessary.dll", nullptr, 0, &g_TessaryLoad);
     BindServiceExports();

@@ -26,14 +26,17 @@ namespace
         Bytes& F32(float v) { data.append(reinterpret_cast<const char*>(&v), 4); return *this; }
     };
 
-    // Header of a binary mesh with packMargin 0.25, then the triangle (0,0,0) (4,0,0) (2,2,0):
-    // its longest edge first, its apex at (2, 2) once flattened, so the layout is exact.
+    // Header of a binary mesh: parameters 0.5, 0.25, 45, packMargin 0.25, recollectVertices 1 (each
+    // field distinct, so that the library's report shows their order), counts, presence words.
     Bytes BinaryHeader(uint32_t vertexCount, uint32_t triCount, uint32_t uvPresent, uint32_t srcPolyPresent)
     {
         Bytes b;
-        b.F32(0.08f).F32(0.15f).F32(88.0f).F32(0.25f).U32(0);
+        b.F32(0.5f).F32(0.25f).F32(45.0f).F32(0.25f).U32(1);
         return b.U32(vertexCount).U32(triCount).U32(uvPresent).U32(srcPolyPresent);
     }
+
+    // The triangle (0,0,0) (4,0,0) (2,2,0): its longest edge first, its apex at (2, 2) once
+    // flattened, so the layout is exact.
 
     Bytes OneTriangleBinary(uint32_t uvPresent, uint32_t srcPolyPresent)
     {
@@ -108,6 +111,16 @@ namespace
 
     bool Contains(const std::string& text, const std::string& part) { return text.find(part) != std::string::npos; }
 
+    // What the library reports under unwrap-report-inputs (floats as their bit patterns).
+    std::string Hex(float value)
+    {
+        uint32_t bits;
+        std::memcpy(&bits, &value, 4);
+        char text[16];
+        std::snprintf(text, sizeof text, "%X", bits);
+        return text;
+    }
+
     const std::string kUsage = "usage:\nChartBake [-obj] <input_file> <output_file>\n";
 }
 
@@ -146,7 +159,8 @@ INTEGRATION_TEST_SUITE(ChartBake)
         Write("mesh.bin", OneTriangleBinary(0, 0).data);
         Testing::ChildResult r = Run({"mesh.bin", "out.bin"}, {std::string(kBehaviour) + "unwrap-report-fp"});
         CHECK_EQUAL(0, r.exitStatus);
-        CHECK_EQUAL("rounding toward zero, denormals kept\n", r.out);
+        // The control bits of the default 0x1F80 with rounding set to 11: nothing else changed.
+        CHECK_EQUAL("rounding toward zero, denormals kept, control 7F80\n", r.out);
     }
 
     TEST_FIXTURE(ChartBakeFixture, CommandLine_WithoutLibraries_UsageStillWorks)
@@ -189,17 +203,74 @@ INTEGRATION_TEST_SUITE(ChartBake)
     TEST_FIXTURE(ChartBakeFixture, Binary_OptionalBlocks_ReadInOrderAndOnlyUVsWritten)
     {
         Bytes both = OneTriangleBinary(2, 0xFFFFFFFFu);
-        both.F32(0).F32(0).F32(1).F32(0).F32(0).F32(1).U32(7);
+        both.F32(0).F32(0.5f).F32(1).F32(0).F32(0).F32(1).U32(7);
+        Bytes uvOnly = OneTriangleBinary(1, 0);
+        uvOnly.F32(0.5f).F32(0).F32(1).F32(0).F32(0).F32(1);
         Bytes polyOnly = OneTriangleBinary(0, 1);
-        polyOnly.U32(7);
-        const std::vector<std::string> inputs = {OneTriangleBinary(0, 0).data, both.data, polyOnly.data};
-        for (const std::string& input : inputs)
+        polyOnly.U32(9);
+        const std::string head = "param 3F000000 3E800000 42340000 3E800000 1; 3 vertices, 1 triangles; ";
+        const std::pair<std::string, std::string> cases[] = {
+            {OneTriangleBinary(0, 0).data, head + "triUV none; srcPoly none\n"},
+            {both.data, head + "triUV 0 3F000000 3F800000 0 0 3F800000; srcPoly 7\n"},
+            {uvOnly.data, head + "triUV 3F000000 0 3F800000 0 0 3F800000; srcPoly none\n"},
+            {polyOnly.data, head + "triUV none; srcPoly 9\n"}};
+        for (const auto& [input, report] : cases)
         {
             Write("mesh.bin", input);
-            Testing::ChildResult r = Run({"mesh.bin", "out.bin"});
+            Testing::ChildResult r = Run({"mesh.bin", "out.bin"}, {std::string(kBehaviour) + "unwrap-report-inputs"});
             CHECK_EQUAL(0, r.exitStatus);
+            CHECK_EQUAL(report, r.out);
             CHECK_EQUAL(OneTriangleUVs(), Read("out.bin"));
         }
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, EmptyMesh_BinaryOutputIsEmptyAndObjKeepsItsHeader)
+    {
+        // No triangles: the file may end right after the (empty) triangle block.
+        Bytes noTriangles = BinaryHeader(1, 0, 0, 0);
+        noTriangles.F32(1).F32(2).F32(3);
+        Write("mesh.bin", noTriangles.data);
+        CHECK_EQUAL(0, Run({"mesh.bin", "out.bin"}).exitStatus);
+        CHECK(Exists("out.bin"));
+        CHECK_EQUAL("", Read("out.bin"));
+
+        Write("none.obj", "# nothing at all\n");
+        CHECK_EQUAL(0, Run({"-obj", "none.obj", "none_out.obj"}).exitStatus);
+        CHECK_EQUAL("g unwrap_out\n# vertices 0\n# triangles 0\n\n\n\n", Read("none_out.obj"));
+
+        Write("points.obj", "v 1 2 3\n");
+        CHECK_EQUAL(0, Run({"-obj", "points.obj", "points_out.obj"}).exitStatus);
+        CHECK_EQUAL("g unwrap_out\n# vertices 1\n# triangles 0\n\nv 1.000000 2.000000 3.000000\n\n\n",
+                    Read("points_out.obj"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, Obj_DefaultParametersAndOneUVPerCornerReachTheLibrary)
+    {
+        // Each corner names its own UV, out of order; the fourth corner of the quad is dropped.
+        Write("mesh.obj", "v 0 0 0\nv 4 0 0\nv 2 2 0\nvt 0.25 0.5\nvt 1 0\nvt 0 1\nvt 0.5 0.5\n"
+                          "f 1/3/1 2/1/1 3/2/1 1/4/1\n");
+        Testing::ChildResult r = Run({"-obj", "mesh.obj", "out.obj"}, {std::string(kBehaviour) + "unwrap-report-inputs"});
+        CHECK_EQUAL(0, r.exitStatus);
+        CHECK_EQUAL("param 3DA3D70A 3E19999A 42B00000 3B800000 0; 3 vertices, 1 triangles; triUV " + Hex(0) + " " +
+                        Hex(1) + " " + Hex(0.25f) + " " + Hex(0.5f) + " " + Hex(1) + " " + Hex(0) + "; srcPoly none\n",
+                    r.out);
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, Obj_OverlongLinesAreReadInPiecesOf1023Characters)
+    {
+        // The comment's last piece, "v 4 0 0", counts as a position line of its own.
+        Write("mesh.obj", "v 0 0 0\n#" + std::string(1022, 'x') + "v 4 0 0\nv 2 2 0\nvt 0 0\nf 1/1/1 2/1/1 3/1/1\n");
+        CHECK_EQUAL(0, Run({"-obj", "mesh.obj", "out.obj"}).exitStatus);
+        const std::string out = Read("out.obj");
+        CHECK_EQUAL("g unwrap_out\n# vertices 3\n# triangles 1\n\nv 0.000000 0.000000 0.000000\n"
+                    "v 4.000000 0.000000 0.000000\nv 2.000000 2.000000 0.000000\n\n",
+                    out.substr(0, out.find("vt ")));
+
+        // A line split into pieces still counts once when an error names a later line.
+        Write("bad.obj", "#" + std::string(1022, 'x') + "\n#" + std::string(3000, 'y') + "\nf 1/1 2/1 3/1\n");
+        Testing::ChildResult r = Run({"-obj", "bad.obj", "out_bad.obj"});
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK_EQUAL("ChartBake: bad.obj:3: face corners must have the form vertex/uv/normal (three of them)\n", r.err);
     }
 
     TEST_FIXTURE(ChartBakeFixture, Binary_PackMarginFromTheFileIsPassedOn)
@@ -233,21 +304,30 @@ INTEGRATION_TEST_SUITE(ChartBake)
         CHECK_EQUAL(std::string(1023, 'W') + "Z", full.out);
     }
 
-    TEST_FIXTURE(ChartBakeFixture, ErrorBuffer_LibraryRejectsABadIndexOrAnEmptyMesh)
+    TEST_FIXTURE(ChartBakeFixture, BadInput_BinaryTriangleNamesAMissingVertex)
     {
-        Bytes b = BinaryHeader(3, 1, 0, 0);
-        b.F32(0).F32(0).F32(0).F32(4).F32(0).F32(0).F32(2).F32(2).F32(0).U32(0).U32(7).U32(2);
+        Bytes b = BinaryHeader(3, 2, 0, 0);
+        b.F32(0).F32(0).F32(0).F32(4).F32(0).F32(0).F32(2).F32(2).F32(0).U32(0).U32(1).U32(2).U32(2).U32(3).U32(0);
         Write("mesh.bin", b.data);
-        Testing::ChildResult r = Run({"mesh.bin", "out.bin"});
+        Testing::ChildResult r = Run({"mesh.bin", "out.bin"}, {std::string(kBehaviour) + "unwrap-warn"});
         CHECK_EQUAL(1, r.exitStatus);
-        CHECK_EQUAL("GenerateSecondaryUVSet: triangle 0 uses vertex 7, but the mesh has 3 vertices", r.out);
+        CHECK_EQUAL("", r.out);   // the library is never called
+        CHECK_EQUAL("ChartBake: input file mesh.bin: triangle 1 refers to vertex index 3, which does not exist "
+                    "(the file has 3 vertices)\n",
+                    r.err);
         CHECK(!Exists("out.bin"));
+    }
 
-        Write("empty.bin", BinaryHeader(0, 0, 0, 0).data);
-        Testing::ChildResult empty = Run({"empty.bin", "out.bin"});
-        CHECK_EQUAL(1, empty.exitStatus);
-        CHECK_EQUAL("GenerateSecondaryUVSet: the mesh has no triangles", empty.out);
-        CHECK(!Exists("out.bin"));
+    TEST_FIXTURE(ChartBakeFixture, BadInput_FailedWriteRemovesOnlyAnOrdinaryFile)
+    {
+        // Through a link to /dev/full: the write fails, and the device (and the link) must survive.
+        std::filesystem::create_symlink("/dev/full", PathOf("full.bin"));
+        Write("mesh.bin", OneTriangleBinary(0, 0).data);
+        Testing::ChildResult r = Run({"mesh.bin", "full.bin"});
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot write output file full.bin: No space left on device\n", r.err);
+        CHECK(std::filesystem::is_symlink(PathOf("full.bin")));
+        CHECK(std::filesystem::is_character_file("/dev/full"));
     }
 
     TEST_FIXTURE(ChartBakeFixture, NativeTests_AllPass_Exit0)

@@ -3,6 +3,19 @@
 #include <cerrno>
 #include <cstdarg>
 #include <cstring>
+#include <sys/stat.h>
+
+namespace
+{
+    // Only an ordinary file is removed after a failed write: an output named /dev/full, a
+    // terminal or a FIFO is a device or channel that must survive the failure.
+    void RemoveIncompleteOutput(const std::string& path)
+    {
+        struct stat info;
+        if (stat(path.c_str(), &info) == 0 && S_ISREG(info.st_mode))
+            std::remove(path.c_str());
+    }
+}
 
 MeshFileStream::~MeshFileStream()
 {
@@ -102,6 +115,6 @@ std::string MeshFileStream::Close()
     if (errno == 0)
         errno = savedErrno;
     std::string message = Fail("cannot write output file");
-    std::remove(m_Path.c_str());
+    RemoveIncompleteOutput(m_Path);
     return message;
 }

@@ -24,7 +24,8 @@ public:
     // fprintf into the stream; its failures surface at Close.
     void Print(const char* format, ...) __attribute__((format(printf, 2, 3)));
 
-    // Closes; for an output, reports a failed write and removes the incomplete file.
+    // Closes; for an output, reports a failed write and removes the incomplete file (an ordinary
+    // file only: a device such as /dev/full stays).
     std::string Close();
 
     FILE* Handle() const { return m_File; }

@@ -33,6 +33,18 @@ namespace
         return "";
     }
 
+    // Every index of the triangle block must name one of the file's vertices: the library reads
+    // positions through them unchecked.
+    MeshFileError CheckTriangleIndices(const char* path, const uint32_t* tri, uint32_t triCount, uint32_t vertexCount)
+    {
+        for (uint64_t i = 0; i < 3ull * triCount; ++i)
+            if (tri[i] >= vertexCount)
+                return std::string("input file ") + path + ": triangle " + std::to_string(i / 3) + " refers to vertex index " +
+                       std::to_string(tri[i]) + ", which does not exist (the file has " + std::to_string(vertexCount) +
+                       " vertices)";
+        return "";
+    }
+
     template <typename T>
     MeshFileError ReadBlock(MeshFileStream& in, T** block, uint64_t elements, const char* what)
     {
@@ -69,6 +81,7 @@ MeshFileError LoadFromHalvorBinary(const char* path, UnwrapParam* param, uint32_
     *srcPoly = nullptr;
     error = ReadBlock(in, vertex, 3ull * header.vertexCount, "vertex block");
     if (error.empty()) error = ReadBlock(in, tri, 3ull * header.triCount, "triangle block");
+    if (error.empty()) error = CheckTriangleIndices(path, *tri, header.triCount, header.vertexCount);
     if (error.empty() && header.uvPresent) error = ReadBlock(in, uv, 6ull * header.triCount, "UV block");
     if (error.empty() && header.srcPolyPresent) error = ReadBlock(in, srcPoly, header.triCount, "source polygon block");
     return error;

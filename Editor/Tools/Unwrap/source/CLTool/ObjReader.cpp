@@ -3,6 +3,7 @@
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFileStream.h"
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
 
+#include <cerrno>
 #include <cstdlib>
 #include <cstring>
 #include <vector>
@@ -150,7 +151,7 @@ MeshFileError LoadFromObj(const char* path, UnwrapParam* param, uint32_t* vertex
             return error;
     }
     if (std::ferror(in.Handle()))
-        return "cannot read input file " + in.Path();
+        return "cannot read input file " + in.Path() + ": " + std::strerror(errno);
     error = CheckReferences(obj, in.Path());
     if (!error.empty())
         return error;
