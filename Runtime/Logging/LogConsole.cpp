@@ -34,14 +34,11 @@ void LogOutputToSpecificFile(const char* path)
     if (path == nullptr)
         return;
     SetConsoleLogPath(path);
-    FILE* file = fopen(path, "w");
-    // A file that cannot be opened leaves output on standard output.
-    if (file != nullptr)
-    {
-        if (gConsoleFile != nullptr && gConsoleFile != stdout)
-            fclose(gConsoleFile);
-        gConsoleFile = file;
-    }
+    if (gConsoleFile != nullptr && gConsoleFile != stdout)
+        fclose(gConsoleFile);
+    // A file that cannot be opened leaves the console file unset, so output goes to standard
+    // output (OpenConsole), not to a file opened earlier.
+    gConsoleFile = fopen(path, "w");
 }
 
 std::string GetConsoleLogPath()
@@ -134,6 +131,23 @@ void printf_console_log_plain(const char* format, ...)
     va_start(args, format);
     printf_consolev(kLogTypeLog, format, args);
     va_end(args);
+}
+
+std::string FormatLogString(const char* format, va_list args)
+{
+    va_list measure;
+    va_copy(measure, args);
+    const int length = vsnprintf(nullptr, 0, format, measure);
+    va_end(measure);
+    if (length < 0)
+        return format;
+    std::string text(static_cast<size_t>(length) + 1, '\0');
+    va_list print;
+    va_copy(print, args);
+    vsnprintf(text.data(), text.size(), format, print);
+    va_end(print);
+    text.resize(static_cast<size_t>(length));
+    return text;
 }
 
 void print_realstdout(const char* text, size_t length)

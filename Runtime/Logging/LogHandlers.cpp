@@ -79,8 +79,6 @@ void CleanLogHandler(LogType logType, const char* format, ...)
 void InitializeCleanedLogFile(FILE* file)
 {
     gCleanedLogFile = file;
-    // Initialising twice must not write every entry twice.
-    RemoveCleanLogEntryHandler(DefaultCleanLogHandler);
     AddCleanLogEntryHandler(DefaultCleanLogHandler);
 }
 

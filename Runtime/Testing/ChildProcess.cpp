@@ -20,6 +20,19 @@ namespace
         int err[2] = {-1, -1};
     };
 
+    void CloseIfOpen(int& fd)
+    {
+        if (fd >= 0)
+            close(fd);
+        fd = -1;
+    }
+
+    void ClosePipes(Pipes& p)
+    {
+        for (int* fd : {&p.out[0], &p.out[1], &p.err[0], &p.err[1]})
+            CloseIfOpen(*fd);
+    }
+
     bool OpenPipes(Pipes& p)
     {
         return pipe2(p.out, O_CLOEXEC) == 0 && pipe2(p.err, O_CLOEXEC) == 0;
@@ -28,8 +41,6 @@ namespace
     // In the child: route standard output and error into the pipes, standard input from nothing.
     void RedirectInChild(const Pipes& p)
     {
-        fflush(stdout);
-        fflush(stderr);
         dup2(p.out[1], STDOUT_FILENO);
         dup2(p.err[1], STDERR_FILENO);
         int devNull = open("/dev/null", O_RDONLY);
@@ -40,8 +51,8 @@ namespace
     // Reads both pipes until the child closes them, so that neither can fill up and stall it.
     void DrainPipes(Pipes& p, ChildResult& result)
     {
-        close(p.out[1]);
-        close(p.err[1]);
+        CloseIfOpen(p.out[1]);
+        CloseIfOpen(p.err[1]);
         pollfd fds[2] = {{p.out[0], POLLIN, 0}, {p.err[0], POLLIN, 0}};
         std::string* sinks[2] = {&result.out, &result.err};
         int open = 2;
@@ -63,12 +74,12 @@ namespace
                     sinks[i]->append(buffer, static_cast<size_t>(n));
                 else if (n == 0 || errno != EINTR)
                 {
-                    close(fds[i].fd);
                     fds[i].fd = -1;
                     --open;
                 }
             }
         }
+        ClosePipes(p);
     }
 
     void WaitForChild(pid_t pid, ChildResult& result)
@@ -88,21 +99,54 @@ namespace
         result.err = std::string("could not start child process: ") + what + ": " + strerror(errno);
         return result;
     }
+
+    // Forks with standard output and error captured and runs `inChild` in the child, which must
+    // end the child itself (_exit or exec); the parent collects the output and the exit status.
+    ChildResult ForkAndCapture(const std::function<void()>& inChild)
+    {
+        Pipes pipes;
+        if (!OpenPipes(pipes))
+        {
+            ChildResult failed = FailedToStart("pipe");
+            ClosePipes(pipes);
+            return failed;
+        }
+        // Buffered output written before the fork must not be written a second time by the child.
+        fflush(stdout);
+        fflush(stderr);
+        const pid_t pid = fork();
+        if (pid < 0)
+        {
+            ChildResult failed = FailedToStart("fork");
+            ClosePipes(pipes);
+            return failed;
+        }
+        if (pid == 0)
+        {
+            RedirectInChild(pipes);
+            // An exception must not escape into the forked copy of the caller, which would go on
+            // running the caller's code (a whole test run) inside the child.
+            try
+            {
+                inChild();
+            }
+            catch (...)
+            {
+                fprintf(stderr, "uncaught exception in child process\n");
+                fflush(nullptr);
+            }
+            _exit(127);
+        }
+        ChildResult result;
+        DrainPipes(pipes, result);
+        WaitForChild(pid, result);
+        return result;
+    }
 }
 
 ChildResult RunInChildProcess(const std::function<void()>& body)
 {
-    Pipes pipes;
-    if (!OpenPipes(pipes))
-        return FailedToStart("pipe");
-    fflush(stdout);
-    fflush(stderr);
-    pid_t pid = fork();
-    if (pid < 0)
-        return FailedToStart("fork");
-    if (pid == 0)
-    {
-        RedirectInChild(pipes);
+    return ForkAndCapture([&] {
         // Crash signals must end the child for real, not be turned into a test failure.
         for (int sig : {SIGSEGV, SIGILL, SIGFPE, SIGBUS, SIGTRAP, SIGABRT})
             signal(sig, SIG_DFL);
@@ -110,11 +154,7 @@ ChildResult RunInChildProcess(const std::function<void()>& body)
         fflush(stdout);
         fflush(stderr);
         _exit(0);
-    }
-    ChildResult result;
-    DrainPipes(pipes, result);
-    WaitForChild(pid, result);
-    return result;
+    });
 }
 
 ChildResult RunProgram(const std::vector<std::string>& argv, const std::string& workDir,
@@ -122,17 +162,7 @@ ChildResult RunProgram(const std::vector<std::string>& argv, const std::string& 
 {
     if (argv.empty())
         return FailedToStart("empty command line");
-    Pipes pipes;
-    if (!OpenPipes(pipes))
-        return FailedToStart("pipe");
-    fflush(stdout);
-    fflush(stderr);
-    pid_t pid = fork();
-    if (pid < 0)
-        return FailedToStart("fork");
-    if (pid == 0)
-    {
-        RedirectInChild(pipes);
+    return ForkAndCapture([&] {
         if (!workDir.empty() && chdir(workDir.c_str()) != 0)
         {
             fprintf(stderr, "cannot enter %s: %s\n", workDir.c_str(), strerror(errno));
@@ -147,10 +177,6 @@ ChildResult RunProgram(const std::vector<std::string>& argv, const std::string& 
         execv(args[0], args.data());
         fprintf(stderr, "cannot run %s: %s\n", args[0], strerror(errno));
         _exit(127);
-    }
-    ChildResult result;
-    DrainPipes(pipes, result);
-    WaitForChild(pid, result);
-    return result;
+    });
 }
 }

@@ -17,7 +17,8 @@ namespace Testing
     };
 
     // Runs `body` in a forked copy of this process with its standard output and error captured.
-    // A body that returns ends the child with status 0; one that exits or crashes ends it its own way.
+    // A body that returns ends the child with status 0; one that exits or crashes ends it its own way;
+    // one that throws ends it with status 127 and a line on standard error.
     ChildResult RunInChildProcess(const std::function<void()>& body);
 
     // Runs a program (argv[0] is its path) in `workDir`, with `extraEnv` ("NAME=value") added to

@@ -1,5 +1,7 @@
 #include "Runtime/Testing/Testing.h"
 
+#include "Runtime/Logging/LogCapture.h"
+
 #include "Runtime/Threads/Mutex.h"
 #include "Runtime/Threads/Thread.h"
 
@@ -23,6 +25,12 @@ namespace
         Thread* self = static_cast<Thread*>(data);
         while (!self->IsQuitSignaled())
             Thread::Sleep(0.001);
+        return nullptr;
+    }
+
+    void* JoinItself(void* data)
+    {
+        static_cast<Thread*>(data)->WaitForExit(false);
         return nullptr;
     }
 
@@ -80,6 +88,22 @@ UNIT_TEST_SUITE(Threads)
         thread.WaitForExit(true);
         CHECK(!thread.IsRunning());
         CHECK(thread.IsQuitSignaled());
+    }
+
+    TEST(Thread_JoiningItself_LogsTheError_AndIsStillJoinedFromOutside)
+    {
+        Thread thread;
+        thread.SetName("selfish");
+        LogCapture::Result log = LogCapture::Capture([&] {
+            thread.Run(JoinItself, &thread);
+            thread.WaitForExit(false);
+        });
+        CHECK(!thread.IsRunning());
+        CHECK_EQUAL(1u, log.console.size());
+        CHECK_EQUAL("***Thread 'selfish' tried to join itself!*** "
+                    "(Filename: Runtime/Threads/Posix/PlatformThread.cpp Line: 128)\n",
+                    log.console.empty() ? std::string() : log.console.at(0).text);
+        CHECK_EQUAL(kLogTypeError, log.console.empty() ? kLogTypeLog : log.console.at(0).type);
     }
 
     TEST(MainThreadId_IsThisThread)

@@ -50,10 +50,17 @@ bool PlatformThread::Create(const Thread* thread, StartRoutine routine, unsigned
         pthread_attr_setstacksize(&attributes, stackSize);
         attributesToUse = &attributes;
     }
+    // Set before the thread exists: the new thread may ask IsCurrentThread (a self-join) before
+    // pthread_create has returned here. The handle itself is stored before the thread starts.
+    m_HasThread = true;
     const int error = pthread_create(&m_Thread, attributesToUse, routine, const_cast<Thread*>(thread));
     if (attributesToUse != nullptr)
         pthread_attr_destroy(&attributes);
-    m_HasThread = error == 0;
+    if (error != 0)
+    {
+        m_Thread = pthread_t();
+        m_HasThread = false;
+    }
     return m_HasThread;
 }
 
