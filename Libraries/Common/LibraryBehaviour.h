@@ -9,6 +9,8 @@
 //                       "rounding toward zero|to nearest|..., denormals kept|flushed, control <hex>\n"
 //   unwrap-report-inputs  like unwrap-warn, but the text tells the parameters, counts and optional
 //                       arrays it was called with (Libraries/Unwrap/BehaviourReports.h)
+//   unwrap-grid         GenerateSecondaryUVSet lays out every triangle as a chart of its own, in a
+//                       grid of equal cells (the layout of Libraries/Unwrap/ChartLayout.h)
 //   fail:<export>       the named test export returns false
 //   crash:<export>      the named test export writes through a null pointer
 // Unset or empty: everything does its real work.

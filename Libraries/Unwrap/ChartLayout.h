@@ -1,5 +1,6 @@
-// Lays out every triangle as a chart of its own: flattened at its true shape, all charts at one
-// uniform scale, packed row by row into a square grid inside the unit square.
+// The layout a run gets with "unwrap-grid" (LibraryBehaviour.h): every triangle a chart of its own,
+// flattened at its true shape, all charts at one uniform scale, packed row by row into a square
+// grid inside the unit square. The chart layout uses FlattenTriangle for degenerate triangles.
 #pragma once
 
 #include <stdint.h>

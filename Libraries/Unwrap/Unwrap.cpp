@@ -1,8 +1,10 @@
-// GenerateSecondaryUVSet: checks the mesh, flattens every triangle into a chart of its own and
-// packs the charts into a grid (ChartLayout). Scratch memory comes from Tessary.dll's allocator.
+// GenerateSecondaryUVSet: checks the mesh, then lays it out in charts (ChartUnwrap), or, when the
+// run asks for "unwrap-grid", every triangle as a chart of its own in a grid (ChartLayout).
+// Scratch memory comes from Tessary.dll's allocator.
 #include "../Tessary/TessaryApi.h"
 #include "BehaviourReports.h"
 #include "ChartLayout.h"
+#include "ChartUnwrap.h"
 #include "DllRuntime.h"
 #include "LibraryBehaviour.h"
 #include "UnwrapApi.h"
@@ -48,8 +50,8 @@ namespace
         return true;
     }
 
-    bool Layout(const float* vertex, const uint32_t* tri, uint32_t triCount, float* outUV, float packMargin, char* buffer,
-                uint32_t size)
+    bool LayOutGrid(const float* vertex, const uint32_t* tri, uint32_t triCount, float* outUV, float packMargin, char* buffer,
+                    uint32_t size)
     {
         float* flat = (float*)Tessary_Allocate(triCount * 24);
         if (!flat)
@@ -67,6 +69,15 @@ namespace
             PlaceChart(grid, t, flat + 6 * t, scale, outUV + 6 * t);
         Tessary_Deallocate(flat);
         return true;
+    }
+
+    bool LayOutCharts(const float* vertex, int32_t vertexCount, const uint32_t* tri, const uint32_t* srcPoly, int32_t triCount,
+                      float* outUV, const UnwrapParam& param, char* buffer, uint32_t size)
+    {
+        const char* error = nullptr;
+        if (UnwrapIntoCharts(vertex, (uint32_t)vertexCount, tri, srcPoly, (uint32_t)triCount, param, outUV, &error))
+            return true;
+        return Fail(buffer, size, error);
     }
 
     void FillWholeBuffer(char* buffer, uint32_t size)
@@ -93,7 +104,11 @@ extern "C" bool GenerateSecondaryUVSet(const float* vertex, int32_t vertexCount,
         ReportInputs(param, vertexCount, triCount, triUV, srcPoly, errorBuffer, errorBufferSize);
     if (BehaviourRequested("unwrap-fill") && errorBuffer)
         FillWholeBuffer(errorBuffer, errorBufferSize);
-    return triCount == 0 || Layout(vertex, tri, (uint32_t)triCount, outUV, param.packMargin, errorBuffer, errorBufferSize);
+    if (triCount == 0)
+        return true;
+    if (BehaviourRequested("unwrap-grid"))
+        return LayOutGrid(vertex, tri, (uint32_t)triCount, outUV, param.packMargin, errorBuffer, errorBufferSize);
+    return LayOutCharts(vertex, vertexCount, tri, srcPoly, triCount, outUV, param, errorBuffer, errorBufferSize);
 }
 
 extern "C" BOOL DllMain(HMODULE, DWORD reason, void*)

@@ -1,0 +1,493 @@
+// End-to-end tests of the bundled Unwrap.dll's default chart layout: the real ChartBake runs on
+// small meshes written here, and the UVs it writes are checked for the layout's promises: charts
+// follow the surface, sit inside the unit square with the margin around them, never overlap,
+// never flip a triangle, and share one texel density.
+#include "Runtime/Testing/ChildProcess.h"
+#include "Runtime/Testing/Testing.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <map>
+#include <numeric>
+#include <sstream>
+#include <string>
+#include <tuple>
+#include <vector>
+
+namespace
+{
+    struct Mesh
+    {
+        std::vector<float> positions;   // 3 a vertex
+        std::vector<uint32_t> tri;      // 3 a triangle
+        uint32_t TriCount() const { return uint32_t(tri.size() / 3); }
+        uint32_t Add(float x, float y, float z)
+        {
+            positions.insert(positions.end(), {x, y, z});
+            return uint32_t(positions.size() / 3 - 1);
+        }
+        void Face(uint32_t a, uint32_t b, uint32_t c) { tri.insert(tri.end(), {a, b, c}); }
+    };
+
+    struct Params
+    {
+        float angleDistortion = 0.08f, areaDistortion = 0.15f, hardAngle = 88.0f, packMargin = 1.0f / 256;
+        uint32_t recollectVertices = 0;
+    };
+
+    struct Vec2
+    {
+        double x, y;
+    };
+
+    Vec2 Sub(Vec2 a, Vec2 b) { return {a.x - b.x, a.y - b.y}; }
+    double Cross2(Vec2 a, Vec2 b) { return a.x * b.y - a.y * b.x; }
+
+    // The UVs ChartBake wrote, one pair a corner, read back with the mesh they belong to.
+    struct Layout
+    {
+        Mesh mesh;
+        std::vector<float> uv;
+        Vec2 Corner(uint32_t t, int c) const { return {uv[6 * t + 2 * c], uv[6 * t + 2 * c + 1]}; }
+        double UVArea(uint32_t t) const { return 0.5 * Cross2(Sub(Corner(t, 1), Corner(t, 0)), Sub(Corner(t, 2), Corner(t, 0))); }
+        double Area3(uint32_t t) const
+        {
+            const float* p[3];
+            for (int c = 0; c < 3; ++c)
+                p[c] = &mesh.positions[3 * mesh.tri[3 * t + c]];
+            double a[3], b[3];
+            for (int k = 0; k < 3; ++k)
+                a[k] = p[1][k] - p[0][k], b[k] = p[2][k] - p[0][k];
+            double x = a[1] * b[2] - a[2] * b[1], y = a[2] * b[0] - a[0] * b[2], z = a[0] * b[1] - a[1] * b[0];
+            return 0.5 * std::sqrt(x * x + y * y + z * z);
+        }
+        bool Degenerate(uint32_t t) const { return Area3(t) < 1e-9; }
+    };
+
+    // The raw binary mesh, with a source-polygon block when srcPoly is not empty.
+    std::string BinaryMesh(const Mesh& mesh, const Params& p, const std::vector<uint32_t>& srcPoly)
+    {
+        std::string bytes;
+        auto put = [&bytes](const void* data, size_t size) { bytes.append(static_cast<const char*>(data), size); };
+        const float params[4] = {p.angleDistortion, p.areaDistortion, p.hardAngle, p.packMargin};
+        const uint32_t header[5] = {p.recollectVertices, uint32_t(mesh.positions.size() / 3), mesh.TriCount(), 0,
+                                    srcPoly.empty() ? 0u : 1u};
+        put(params, 16);
+        put(header, 20);
+        put(mesh.positions.data(), 4 * mesh.positions.size());
+        put(mesh.tri.data(), 4 * mesh.tri.size());
+        put(srcPoly.data(), 4 * srcPoly.size());
+        return bytes;
+    }
+
+    // Triangles joined through corners of one vertex index with the very same UV form one chart.
+    // Returns each triangle's chart number (0, 1, ... in order of first appearance).
+    std::vector<uint32_t> Charts(const Layout& layout)
+    {
+        uint32_t n = layout.mesh.TriCount();
+        std::vector<uint32_t> parent(n);
+        std::iota(parent.begin(), parent.end(), 0);
+        auto root = [&parent](uint32_t t) {
+            while (parent[t] != t)
+                t = parent[t] = parent[parent[t]];
+            return t;
+        };
+        std::map<std::tuple<uint32_t, float, float>, uint32_t> firstUse;
+        for (uint32_t t = 0; t < n; ++t)
+            for (int c = 0; c < 3; ++c)
+            {
+                auto key = std::make_tuple(layout.mesh.tri[3 * t + c], layout.uv[6 * t + 2 * c], layout.uv[6 * t + 2 * c + 1]);
+                auto [it, fresh] = firstUse.emplace(key, t);
+                if (!fresh)
+                    parent[root(t)] = root(it->second);
+            }
+        std::map<uint32_t, uint32_t> numbers;
+        std::vector<uint32_t> chart(n);
+        for (uint32_t t = 0; t < n; ++t)
+            chart[t] = numbers.emplace(root(t), uint32_t(numbers.size())).first->second;
+        return chart;
+    }
+
+    uint32_t ChartCount(const std::vector<uint32_t>& charts)
+    {
+        return charts.empty() ? 0 : *std::max_element(charts.begin(), charts.end()) + 1;
+    }
+
+    double PointSegmentDistance(Vec2 p, Vec2 a, Vec2 b)
+    {
+        Vec2 ab = Sub(b, a), ap = Sub(p, a);
+        double length2 = ab.x * ab.x + ab.y * ab.y;
+        double s = length2 > 0 ? std::clamp((ap.x * ab.x + ap.y * ab.y) / length2, 0.0, 1.0) : 0.0;
+        double dx = ap.x - s * ab.x, dy = ap.y - s * ab.y;
+        return std::sqrt(dx * dx + dy * dy);
+    }
+
+    bool SegmentsCross(Vec2 a, Vec2 b, Vec2 c, Vec2 d)
+    {
+        double d1 = Cross2(Sub(b, a), Sub(c, a)), d2 = Cross2(Sub(b, a), Sub(d, a));
+        double d3 = Cross2(Sub(d, c), Sub(a, c)), d4 = Cross2(Sub(d, c), Sub(b, c));
+        return ((d1 > 0) != (d2 > 0)) && ((d3 > 0) != (d4 > 0)) && d1 != 0 && d2 != 0 && d3 != 0 && d4 != 0;
+    }
+
+    bool InsideTriangle(Vec2 p, const Vec2* t)
+    {
+        double area = Cross2(Sub(t[1], t[0]), Sub(t[2], t[0]));
+        if (std::fabs(area) < 1e-12)
+            return false;
+        double s = area > 0 ? 1 : -1;
+        for (int c = 0; c < 3; ++c)
+            if (s * Cross2(Sub(t[(c + 1) % 3], t[c]), Sub(p, t[c])) < 0)
+                return false;
+        return true;
+    }
+
+    // Distance between two UV triangles (0 when they overlap or touch).
+    double TriangleDistance(const Layout& layout, uint32_t s, uint32_t t)
+    {
+        Vec2 a[3], b[3];
+        for (int c = 0; c < 3; ++c)
+            a[c] = layout.Corner(s, c), b[c] = layout.Corner(t, c);
+        double best = 1e300;
+        for (int i = 0; i < 3; ++i)
+        {
+            if (InsideTriangle(a[i], b) || InsideTriangle(b[i], a))
+                return 0;
+            for (int j = 0; j < 3; ++j)
+            {
+                Vec2 p = a[i], q = a[(i + 1) % 3], u = b[j], v = b[(j + 1) % 3];
+                if (SegmentsCross(p, q, u, v))
+                    return 0;
+                best = std::min({best, PointSegmentDistance(p, u, v), PointSegmentDistance(q, u, v),
+                                 PointSegmentDistance(u, p, q), PointSegmentDistance(v, p, q)});
+            }
+        }
+        return best;
+    }
+
+    const double kTolerance = 1e-6;
+
+    bool SharesAVertex(const Mesh& mesh, uint32_t s, uint32_t t)
+    {
+        for (int i = 0; i < 3; ++i)
+            for (int j = 0; j < 3; ++j)
+                if (mesh.tri[3 * s + i] == mesh.tri[3 * t + j])
+                    return true;
+        return false;
+    }
+
+    // The promises every layout keeps; "" when all hold, else the first one broken. Triangles of
+    // one chart that share no vertex must not even touch (true of the meshes used here).
+    std::string BrokenPromise(const Layout& layout, double margin, bool planarCharts)
+    {
+        char text[200];
+        for (size_t i = 0; i < layout.uv.size(); ++i)
+            if (!std::isfinite(layout.uv[i]) || layout.uv[i] < margin - kTolerance || layout.uv[i] > 1 - margin + kTolerance)
+                return std::snprintf(text, sizeof text, "uv %zu = %g is not within the margin", i, layout.uv[i]), text;
+        std::vector<uint32_t> charts = Charts(layout);
+        double ratio = -1;
+        for (uint32_t t = 0; t < layout.mesh.TriCount(); ++t)
+        {
+            if (layout.Degenerate(t))
+                continue;
+            if (!(layout.UVArea(t) > 0))
+                return std::snprintf(text, sizeof text, "triangle %u is flipped or collapsed", t), text;
+            double r = layout.UVArea(t) / layout.Area3(t);
+            ratio = ratio < 0 ? r : ratio;
+            if (planarCharts && std::fabs(r - ratio) > 1e-3 * ratio)
+                return std::snprintf(text, sizeof text, "triangle %u has texel density %g, not %g", t, r, ratio), text;
+        }
+        for (uint32_t s = 0; s < layout.mesh.TriCount(); ++s)
+            for (uint32_t t = s + 1; t < layout.mesh.TriCount(); ++t)
+            {
+                if (charts[s] != charts[t] && TriangleDistance(layout, s, t) < margin - kTolerance)
+                    return std::snprintf(text, sizeof text, "triangles %u and %u of different charts are %g apart", s, t,
+                                         TriangleDistance(layout, s, t)), text;
+                if (charts[s] == charts[t] && !SharesAVertex(layout.mesh, s, t) && TriangleDistance(layout, s, t) == 0)
+                    return std::snprintf(text, sizeof text, "triangles %u and %u of one chart overlap", s, t), text;
+            }
+        return "";
+    }
+
+    struct ChartsFixture
+    {
+        std::string dir;
+
+        ChartsFixture()
+        {
+            char pattern[] = "/tmp/chartbake-charts-XXXXXX";
+            dir = mkdtemp(pattern);
+        }
+        ~ChartsFixture() { std::filesystem::remove_all(dir); }
+
+        std::string Read(const std::string& name) const
+        {
+            std::ifstream in(dir + "/" + name, std::ios::binary);
+            std::ostringstream text;
+            text << in.rdbuf();
+            return text.str();
+        }
+
+        // Unwraps `mesh` through the binary format; an empty layout when ChartBake fails.
+        Layout Unwrap(const Mesh& mesh, const Params& params = Params(), const std::vector<uint32_t>& srcPoly = {}) const
+        {
+            std::ofstream(dir + "/mesh.bin", std::ios::binary) << BinaryMesh(mesh, params, srcPoly);
+            Testing::ChildResult r = Testing::RunProgram({std::string(CHARTBAKE_BIN_DIR) + "/ChartBake", "mesh.bin", "out.bin"}, dir);
+            Layout layout{mesh, {}};
+            std::string bytes = Read("out.bin");
+            if (r.exitStatus != 0 || bytes.size() != 24 * mesh.tri.size() / 3)
+                return layout;
+            layout.uv.resize(bytes.size() / 4);
+            std::memcpy(layout.uv.data(), bytes.data(), bytes.size());
+            return layout;
+        }
+    };
+
+    Mesh FlatGrid(uint32_t quads)
+    {
+        Mesh mesh;
+        for (uint32_t y = 0; y <= quads; ++y)
+            for (uint32_t x = 0; x <= quads; ++x)
+                mesh.Add(float(x), float(y), 0);
+        for (uint32_t y = 0; y < quads; ++y)
+            for (uint32_t x = 0; x < quads; ++x)
+            {
+                uint32_t a = y * (quads + 1) + x, b = a + 1, d = a + quads + 1, e = d + 1;
+                mesh.Face(a, b, e);
+                mesh.Face(a, e, d);
+            }
+        return mesh;
+    }
+
+    // Two triangles on the common edge (0,0,0)-(0,1,0): one in the plane z = 0, the other turned
+    // up out of it, so that their normals are `degrees` apart.
+    Mesh Fold(double degrees)
+    {
+        Mesh mesh;
+        double turn = degrees * 3.14159265358979323846 / 180;
+        mesh.Add(0, 0, 0);
+        mesh.Add(0, 1, 0);
+        mesh.Add(1, 0.5f, 0);
+        mesh.Add(float(-std::cos(turn)), 0.5f, float(std::sin(turn)));
+        mesh.Face(0, 2, 1);
+        mesh.Face(0, 1, 3);
+        return mesh;
+    }
+}
+
+INTEGRATION_TEST_SUITE(ChartBakeCharts)
+{
+    TEST_FIXTURE(ChartsFixture, Cube_SixChartsOfTwoTrianglesSharingTheirDiagonal)
+    {
+        const char* const cube =
+            "v 0 0 0\nv 1 0 0\nv 1 1 0\nv 0 1 0\nv 0 0 1\nv 1 0 1\nv 1 1 1\nv 0 1 1\nvt 0 0\n"
+            "f 1/1/1 4/1/1 3/1/1\nf 1/1/1 3/1/1 2/1/1\nf 5/1/1 6/1/1 7/1/1\nf 5/1/1 7/1/1 8/1/1\n"
+            "f 1/1/1 2/1/1 6/1/1\nf 1/1/1 6/1/1 5/1/1\nf 2/1/1 3/1/1 7/1/1\nf 2/1/1 7/1/1 6/1/1\n"
+            "f 3/1/1 4/1/1 8/1/1\nf 3/1/1 8/1/1 7/1/1\nf 4/1/1 1/1/1 5/1/1\nf 4/1/1 5/1/1 8/1/1\n";
+        std::ofstream(dir + "/cube.obj") << cube;
+        Testing::ChildResult r = Testing::RunProgram({std::string(CHARTBAKE_BIN_DIR) + "/ChartBake", "-obj", "cube.obj", "out.obj"}, dir);
+        CHECK_EQUAL(0, r.exitStatus);
+
+        // Read back: the positions as given, a "vt" per corner and faces "f v/t v/t v/t".
+        Layout layout;
+        std::istringstream in(Read("out.obj"));
+        std::vector<float> vts;
+        for (std::string line; std::getline(in, line);)
+        {
+            float a, b, c;
+            uint32_t v[3], t[3];
+            if (std::sscanf(line.c_str(), "v %f %f %f", &a, &b, &c) == 3)
+                layout.mesh.Add(a, b, c);
+            else if (std::sscanf(line.c_str(), "vt %f %f", &a, &b) == 2)
+                vts.insert(vts.end(), {a, b});
+            else if (std::sscanf(line.c_str(), "f %u/%u %u/%u %u/%u", &v[0], &t[0], &v[1], &t[1], &v[2], &t[2]) == 6)
+                for (int k = 0; k < 3; ++k)
+                {
+                    layout.mesh.tri.push_back(v[k] - 1);
+                    layout.uv.insert(layout.uv.end(), {vts.at(2 * (t[k] - 1)), vts.at(2 * (t[k] - 1) + 1)});
+                }
+        }
+        CHECK_EQUAL(12u, layout.mesh.TriCount());
+        CHECK_EQUAL(36u, layout.uv.size() / 2);
+        std::vector<uint32_t> charts = Charts(layout);
+        CHECK_EQUAL(6u, ChartCount(charts));
+        for (uint32_t face = 0; face < 6; ++face)
+            CHECK_EQUAL(charts[2 * face], charts[2 * face + 1]);   // the two triangles of a face, through their diagonal
+        // The OBJ output has six decimals: allow for them in the margins.
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256 - 1e-6, true));
+    }
+
+    TEST_FIXTURE(ChartsFixture, FlatGrid_OneChartWithOneUVPerVertex)
+    {
+        Layout layout = Unwrap(FlatGrid(4));
+        CHECK_EQUAL(32u * 6, layout.uv.size());
+        CHECK_EQUAL(1u, ChartCount(Charts(layout)));
+        std::map<std::pair<float, float>, int> distinct;
+        for (size_t i = 0; i + 1 < layout.uv.size(); i += 2)
+            ++distinct[{layout.uv[i], layout.uv[i + 1]}];
+        CHECK_EQUAL(25u, distinct.size());
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, true));
+    }
+
+    TEST_FIXTURE(ChartsFixture, Fold_ANewChartStartsBeyondTheHardAngle)
+    {
+        // Distortion limits wide open: only the dihedral angle decides.
+        Params loose;
+        loose.angleDistortion = 10;
+        loose.areaDistortion = 1;
+        loose.hardAngle = 45;
+        const std::pair<double, uint32_t> cases[] = {{30, 1}, {44, 1}, {46, 2}, {80, 2}};
+        for (const auto& [degrees, charts] : cases)
+        {
+            Layout layout = Unwrap(Fold(degrees), loose);
+            CHECK_EQUAL(12u, layout.uv.size());
+            CHECK_EQUAL(charts, ChartCount(Charts(layout)));
+            CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, charts == 2));
+        }
+        // The defaults: a fold of 100 degrees is beyond hardAngle 88.
+        Layout defaults = Unwrap(Fold(100));
+        CHECK_EQUAL(2u, ChartCount(Charts(defaults)));
+        CHECK_EQUAL("", BrokenPromise(defaults, 1.0 / 256, true));
+    }
+
+    TEST_FIXTURE(ChartsFixture, SourcePolygon_KeepsItsTrianglesTogetherAcrossAHardEdge)
+    {
+        Params loose;
+        loose.angleDistortion = 10;
+        loose.areaDistortion = 1;
+        loose.hardAngle = 45;
+        CHECK_EQUAL(2u, ChartCount(Charts(Unwrap(Fold(60), loose, {4, 5}))));
+        Layout onePolygon = Unwrap(Fold(60), loose, {4, 4});
+        CHECK_EQUAL(1u, ChartCount(Charts(onePolygon)));
+        CHECK_EQUAL("", BrokenPromise(onePolygon, 1.0 / 256, false));
+    }
+
+    TEST_FIXTURE(ChartsFixture, RecollectVertices_WeldsSplitVerticesIntoOneChart)
+    {
+        // A square whose two triangles have their own copies of the diagonal's vertices.
+        Mesh mesh;
+        mesh.Add(0, 0, 0);
+        mesh.Add(1, 0, 0);
+        mesh.Add(1, 1, 0);
+        mesh.Add(1, 1, 0);
+        mesh.Add(0, 1, 0);
+        mesh.Add(-0.0f, 0, 0);
+        mesh.Face(0, 1, 2);
+        mesh.Face(5, 3, 4);
+        CHECK_EQUAL(2u, ChartCount(Charts(Unwrap(mesh))));
+        Params weld;
+        weld.recollectVertices = 1;
+        Layout welded = Unwrap(mesh, weld);
+        CHECK_EQUAL(12u, welded.uv.size());
+        // One chart: the copies of a vertex got one UV.
+        CHECK_EQUAL(welded.uv[0], welded.uv[6]);
+        CHECK_EQUAL(welded.uv[1], welded.uv[7]);
+        CHECK_EQUAL(welded.uv[4], welded.uv[8]);
+        CHECK_EQUAL(welded.uv[5], welded.uv[9]);
+        welded.mesh.tri = {0, 1, 2, 0, 2, 4};   // the copies replaced, as the library sees them
+        CHECK_EQUAL(1u, ChartCount(Charts(welded)));
+        CHECK_EQUAL("", BrokenPromise(welded, 1.0 / 256, true));
+    }
+
+    TEST_FIXTURE(ChartsFixture, Distortion_TiltBeyondTheAreaThresholdStartsANewChart)
+    {
+        // A fold of 20 degrees loses 1 - cos 20 = 6% of the area when projected: within 0.15, not
+        // within 0.05. Angle distortion is left wide open.
+        Params params;
+        params.angleDistortion = 10;
+        CHECK_EQUAL(1u, ChartCount(Charts(Unwrap(Fold(20), params))));
+        params.areaDistortion = 0.05f;
+        CHECK_EQUAL(2u, ChartCount(Charts(Unwrap(Fold(20), params))));
+    }
+
+    TEST_FIXTURE(ChartsFixture, Adjacency_AnEdgeOfThreeTrianglesJoinsNothing)
+    {
+        // Three triangles in one plane on the edge 0-1: two of them lie on the same side and
+        // overlap, so joining across that edge would fold a chart onto itself.
+        Mesh mesh;
+        mesh.Add(0, 0, 0);
+        mesh.Add(1, 0, 0);
+        mesh.Add(0.5f, -1, 0);
+        mesh.Add(0.3f, 1, 0);
+        mesh.Add(0.7f, 1, 0);
+        mesh.Face(0, 2, 1);
+        mesh.Face(1, 3, 0);
+        mesh.Face(1, 4, 0);
+        Layout layout = Unwrap(mesh);
+        CHECK_EQUAL(3u, ChartCount(Charts(layout)));
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, true));
+    }
+
+    TEST_FIXTURE(ChartsFixture, Spiral_ARampThatWindsOverItselfIsSplit)
+    {
+        // A ramp between radii 1 and 2 climbing gently through one and a quarter turns: every
+        // step joins its neighbour, but seen from above the ramp covers itself.
+        Mesh mesh;
+        const int steps = 50;
+        for (int i = 0; i <= steps; ++i)
+        {
+            double angle = 2.5 * 3.14159265358979323846 * i / steps;
+            for (double radius : {1.0, 2.0})
+                mesh.Add(float(radius * std::cos(angle)), float(radius * std::sin(angle)), float(0.1 * angle));
+        }
+        for (uint32_t i = 0; i < steps; ++i)
+        {
+            mesh.Face(2 * i, 2 * i + 1, 2 * i + 3);
+            mesh.Face(2 * i, 2 * i + 3, 2 * i + 2);
+        }
+        Layout layout = Unwrap(mesh);
+        CHECK_EQUAL(2u * steps * 6, layout.uv.size());
+        uint32_t charts = ChartCount(Charts(layout));
+        CHECK(charts >= 2 && charts <= 4);
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, false));
+    }
+
+    TEST_FIXTURE(ChartsFixture, Degenerate_TrianglesStillGetValidUVs)
+    {
+        Mesh mesh = FlatGrid(1);
+        uint32_t p = mesh.Add(3, 3, 3), q = mesh.Add(3, 3, 3), s = mesh.Add(5, 3, 3), u = mesh.Add(4, 3, 3);
+        mesh.Face(p, q, s);   // two corners on one position
+        mesh.Face(p, p, s);   // a repeated index
+        mesh.Face(p, s, u);   // three corners on a line
+        mesh.Face(p, q, p);   // a single point
+        mesh.Face(0, 1, 1);   // a repeated index on an edge of the quad
+        Layout layout = Unwrap(mesh);
+        CHECK_EQUAL(7u * 6, layout.uv.size());
+        std::vector<uint32_t> charts = Charts(layout);
+        CHECK_EQUAL(charts[0], charts[1]);
+        for (uint32_t t = 2; t < 7; ++t)
+            CHECK(charts[t] != charts[0]);
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, true));
+    }
+
+    TEST_FIXTURE(ChartsFixture, ManyCharts_PackedApartAtOneScale)
+    {
+        // 150 loose triangles of varied size and shape, in varied planes.
+        Mesh mesh;
+        std::srand(7);
+        auto random = [] { return float(std::rand()) / RAND_MAX; };
+        for (int i = 0; i < 150; ++i)
+        {
+            float size = 0.2f + 3 * random(), x = 10 * random(), y = 10 * random(), z = 10 * random();
+            uint32_t a = mesh.Add(x, y, z);
+            uint32_t b = mesh.Add(x + size, y + size * random(), z + random());
+            uint32_t c = mesh.Add(x + size * random(), y + size * (0.3f + random()), z - random());
+            mesh.Face(a, b, c);
+        }
+        Params params;
+        params.packMargin = 0.01f;
+        Layout layout = Unwrap(mesh, params);
+        CHECK_EQUAL(150u * 6, layout.uv.size());
+        CHECK_EQUAL(150u, ChartCount(Charts(layout)));
+        CHECK_EQUAL("", BrokenPromise(layout, 0.01, true));
+        double covered = 0;
+        for (uint32_t t = 0; t < layout.mesh.TriCount(); ++t)
+            covered += layout.UVArea(t);
+        CHECK(covered > 0.2);
+    }
+}

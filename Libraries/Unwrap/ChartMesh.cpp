@@ -1,0 +1,15 @@
+#include "ChartMesh.h"
+
+void MeasureTriangles(const float* vertex, const uint32_t* tri, uint32_t triCount, Vec3* cross, uint8_t* degenerate)
+{
+    for (uint32_t t = 0; t < triCount; ++t)
+    {
+        Vec3 p0 = Position(vertex, tri[3 * t]), p1 = Position(vertex, tri[3 * t + 1]), p2 = Position(vertex, tri[3 * t + 2]);
+        Vec3 e0 = p1 - p0, e1 = p2 - p1, e2 = p0 - p2;
+        double longest = Dot(e0, e0);
+        longest = Dot(e1, e1) > longest ? Dot(e1, e1) : longest;
+        longest = Dot(e2, e2) > longest ? Dot(e2, e2) : longest;
+        cross[t] = Cross(e0, p2 - p0);
+        degenerate[t] = !(Length(cross[t]) > 1e-9 * longest) || longest == 0;
+    }
+}
