@@ -4,6 +4,7 @@
 #include "Runtime/Testing/ChildProcess.h"
 #include "Runtime/Testing/Testing.h"
 
+#include <algorithm>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
@@ -203,6 +204,80 @@ INTEGRATION_TEST_SUITE(ChartBake)
         CHECK_EQUAL(expected, Read("out.obj"));
     }
 
+    TEST_FIXTURE(ChartBakeFixture, Obj_OutputOfSeveralBlocks_MatchesPrintf)
+    {
+        // A grid of 24000 triangles, some 2.5 MB of OBJ text. Its coordinates are short dyadic
+        // decimals, so the OBJ and binary inputs hold the same floats; the binary run's output gives
+        // the UVs the OBJ run must print.
+        const uint32_t columns = 60, rows = 200, across = columns + 1;
+        std::string obj;
+        Bytes bin;
+        bin.F32(0.08f).F32(0.15f).F32(88.0f).F32(1.0f / 256).U32(0);
+        bin.U32(across * (rows + 1)).U32(2 * columns * rows).U32(0).U32(0);
+        std::vector<float> vertex;
+        for (uint32_t y = 0; y <= rows; ++y)
+            for (uint32_t x = 0; x < across; ++x)
+                vertex.insert(vertex.end(), {0.375f * float(x) - 7, 1.25f * float(y), -0.5f * float(x * y % 7)});
+        char line[128];
+        for (size_t i = 0; i < vertex.size(); i += 3)
+        {
+            std::snprintf(line, sizeof line, "v %.9g %.9g %.9g\n", vertex[i], vertex[i + 1], vertex[i + 2]);
+            obj += line;
+            bin.F32(vertex[i]).F32(vertex[i + 1]).F32(vertex[i + 2]);
+        }
+        obj += "vt 0 0\nvn 0 0 1\n";
+        std::vector<uint32_t> tri;
+        for (uint32_t y = 0; y < rows; ++y)
+            for (uint32_t x = 0; x < columns; ++x)
+            {
+                uint32_t a = y * across + x, b = a + 1, c = a + across, d = c + 1;
+                tri.insert(tri.end(), {a, b, d, a, d, c});
+            }
+        for (size_t i = 0; i < tri.size(); i += 3)
+        {
+            std::snprintf(line, sizeof line, "f %u/1/1 %u/1/1 %u/1/1\n", tri[i] + 1, tri[i + 1] + 1, tri[i + 2] + 1);
+            obj += line;
+            bin.U32(tri[i]).U32(tri[i + 1]).U32(tri[i + 2]);
+        }
+        Write("mesh.obj", obj);
+        Write("mesh.bin", bin.data);
+        CHECK_EQUAL(0, Run({"mesh.bin", "out.bin"}).exitStatus);
+        CHECK_EQUAL(0, Run({"-obj", "mesh.obj", "out.obj"}).exitStatus);
+        const std::string uvBytes = Read("out.bin");
+        CHECK_EQUAL(tri.size() * 8, uvBytes.size());
+        std::vector<float> uv(uvBytes.size() / 4);
+        std::memcpy(uv.data(), uvBytes.data(), uvBytes.size());
+
+        std::snprintf(line, sizeof line, "g unwrap_out\n# vertices %zu\n# triangles %zu\n\n", vertex.size() / 3,
+                      tri.size() / 3);
+        std::string expected = line;
+        for (size_t i = 0; i < vertex.size(); i += 3)
+        {
+            std::snprintf(line, sizeof line, "v %f %f %f\n", vertex[i], vertex[i + 1], vertex[i + 2]);
+            expected += line;
+        }
+        expected += "\n";
+        for (size_t i = 0; i < uv.size(); i += 2)
+        {
+            std::snprintf(line, sizeof line, "vt %f %f\n", uv[i], uv[i + 1]);
+            expected += line;
+        }
+        expected += "\n";
+        for (uint32_t i = 0; i < tri.size(); i += 3)
+        {
+            std::snprintf(line, sizeof line, "f %u/%u %u/%u %u/%u\n", tri[i] + 1, i + 1, tri[i + 1] + 1, i + 2,
+                          tri[i + 2] + 1, i + 3);
+            expected += line;
+        }
+        const std::string actual = Read("out.obj");
+        CHECK(expected.size() > 2 * (1 << 20));
+        // The first difference and what follows it, rather than megabytes of text.
+        size_t at = size_t(std::mismatch(expected.begin(), expected.end(), actual.begin(), actual.end()).first -
+                           expected.begin());
+        CHECK_EQUAL(expected.substr(at, 80), actual.substr(at, 80));
+        CHECK_EQUAL(expected.size(), actual.size());
+    }
+
     TEST_FIXTURE(ChartBakeFixture, Binary_OptionalBlocks_ReadInOrderAndOnlyUVsWritten)
     {
         Bytes both = OneTriangleBinary(2, 0xFFFFFFFFu);
@@ -331,6 +406,24 @@ INTEGRATION_TEST_SUITE(ChartBake)
         CHECK_EQUAL("ChartBake: cannot write output file full.bin: No space left on device\n", r.err);
         CHECK(std::filesystem::is_symlink(PathOf("full.bin")));
         CHECK(std::filesystem::is_character_file("/dev/full"));
+
+        std::filesystem::create_symlink("/dev/full", PathOf("full.obj"));
+        Write("mesh.obj", kTwoTriangleObj);
+        r = Run({"-obj", "mesh.obj", "full.obj"});
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot write output file full.obj: No space left on device\n", r.err);
+        CHECK(std::filesystem::is_symlink(PathOf("full.obj")));
+
+        // An ordinary file that reaches the file size limit part way through is removed.
+        std::string many = "v 0 0 0\nv 4 0 0\nv 2 2 0\nvt 0 0\n";
+        for (int i = 0; i < 40; ++i)
+            many += "f 1/1/1 2/1/1 3/1/1\n";
+        Write("many.obj", many);
+        r = Testing::RunProgram(
+            {"/bin/sh", "-c", "trap '' XFSZ; ulimit -f 1; exec \"$0\" -obj many.obj part.obj", kBinDir + "/ChartBake"}, dir);
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK_EQUAL("ChartBake: cannot write output file part.obj: File too large\n", r.err);
+        CHECK(!Exists("part.obj"));
     }
 
     TEST_FIXTURE(ChartBakeFixture, NativeTests_AllPass_Exit0)

@@ -1,7 +1,6 @@
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFileStream.h"
 
 #include <cerrno>
-#include <cstdarg>
 #include <cstring>
 #include <sys/stat.h>
 
@@ -92,14 +91,6 @@ std::string MeshFileStream::Write(const void* source, size_t bytes)
         return Fail("cannot write output file");
     }
     return "";
-}
-
-void MeshFileStream::Print(const char* format, ...)
-{
-    va_list args;
-    va_start(args, format);
-    std::vfprintf(m_File, format, args);
-    va_end(args);
 }
 
 std::string MeshFileStream::Close()

@@ -21,8 +21,6 @@ public:
     // Reads a 32-bit word that a file may leave out at its end; a missing word leaves *word as it was.
     void ReadOptionalWord(uint32_t* word);
     std::string Write(const void* source, size_t bytes);
-    // fprintf into the stream; its failures surface at Close.
-    void Print(const char* format, ...) __attribute__((format(printf, 2, 3)));
 
     // Closes; for an output, reports a failed write and removes the incomplete file (an ordinary
     // file only: a device such as /dev/full stays).

@@ -1,10 +1,13 @@
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
 
+#include "Editor/Tools/Unwrap/source/CLTool/DecimalText.h"
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFileStream.h"
+#include "Editor/Tools/Unwrap/source/CLTool/TextBlockWriter.h"
 
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <vector>
+#include <string_view>
 
 UnwrapParam DefaultUnwrapParam()
 {
@@ -56,6 +59,42 @@ namespace
             return std::string("out of memory reading ") + in.Path();
         return in.Read(*block, bytes, what);
     }
+
+    // Longest OBJ output line: "vt " or "v " and up to three floats, or "f " and six numbers.
+    constexpr size_t kMaxLineChars = 3 + 3 * (DecimalText::kMaxFloatChars + 1);
+    static_assert(kMaxLineChars >= 2 + 6 * (DecimalText::kMaxUnsignedChars + 1));
+
+    // "<tag>%f %f ...\n" with `count` values, each widened to double.
+    void WriteFloatLine(TextBlockWriter& text, std::string_view tag, const float* values, int count)
+    {
+        char* at = text.Reserve(kMaxLineChars);
+        std::memcpy(at, tag.data(), tag.size());
+        at += tag.size();
+        for (int i = 0; i < count; ++i)
+        {
+            if (i > 0)
+                *at++ = ' ';
+            at = DecimalText::WriteFixed6(values[i], at);
+        }
+        *at++ = '\n';
+        text.Commit(at);
+    }
+
+    // "f %u/%u %u/%u %u/%u\n": one-based vertex numbers, each with its corner's UV number.
+    void WriteFaceLine(TextBlockWriter& text, const uint32_t* corners, uint32_t firstUV)
+    {
+        char* at = text.Reserve(kMaxLineChars);
+        *at++ = 'f';
+        for (uint32_t c = 0; c < 3; ++c)
+        {
+            *at++ = ' ';
+            at = DecimalText::WriteUnsigned(uint32_t(corners[c] + 1), at);
+            *at++ = '/';
+            at = DecimalText::WriteUnsigned(uint32_t(firstUV + c), at);
+        }
+        *at++ = '\n';
+        text.Commit(at);
+    }
 }
 
 MeshFileError LoadFromHalvorBinary(const char* path, UnwrapParam* param, uint32_t* vertexCount, uint32_t* triCount,
@@ -104,15 +143,20 @@ MeshFileError SaveToObj(const char* path, uint32_t vertexCount, uint32_t triCoun
     MeshFileError error = out.OpenForWriting(path, "wt");
     if (!error.empty())
         return error;
-    out.Print("g unwrap_out\n# vertices %u\n# triangles %u\n\n", vertexCount, triCount);
+    TextBlockWriter text(out);
+    char header[80];
+    int headerLength = std::snprintf(header, sizeof header, "g unwrap_out\n# vertices %u\n# triangles %u\n\n", vertexCount,
+                                     triCount);
+    text.Append(std::string_view(header, size_t(headerLength)));
     for (uint32_t v = 0; v < vertexCount; ++v)
-        out.Print("v %f %f %f\n", (double)vertex[3 * v], (double)vertex[3 * v + 1], (double)vertex[3 * v + 2]);
-    out.Print("\n");
+        WriteFloatLine(text, "v ", vertex + 3ull * v, 3);
+    text.Append("\n");
     for (uint64_t corner = 0; corner < 3ull * triCount; ++corner)
-        out.Print("vt %f %f\n", (double)uv[2 * corner], (double)uv[2 * corner + 1]);
-    out.Print("\n");
+        WriteFloatLine(text, "vt ", uv + 2 * corner, 2);
+    text.Append("\n");
     for (uint32_t t = 0; t < triCount; ++t)
-        out.Print("f %u/%u %u/%u %u/%u\n", tri[3 * t] + 1, 3 * t + 1, tri[3 * t + 1] + 1, 3 * t + 2, tri[3 * t + 2] + 1,
-                  3 * t + 3);
-    return out.Close();
+        WriteFaceLine(text, tri + 3ull * t, 3 * t + 1);
+    error = text.Finish();
+    std::string closed = out.Close();
+    return error.empty() ? closed : error;
 }
