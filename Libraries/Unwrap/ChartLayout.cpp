@@ -1,36 +1,34 @@
 #include "ChartLayout.h"
 
+#include "UnwrapMath.h"
 #include "WinImports.h"
 
 namespace
 {
-    double Length(const double* v) { return sqrt(v[0] * v[0] + v[1] * v[1] + v[2] * v[2]); }
     float Clamp01(float x) { return x < 0 ? 0 : (x > 1 ? 1 : x); }
 }
 
 float FlattenTriangle(const float* p0, const float* p1, const float* p2, float* out)
 {
-    const float* p[3] = {p0, p1, p2};
-    double edge[3][3];
+    const Vec3 p[3] = {Position(p0, 0), Position(p1, 0), Position(p2, 0)};
+    Vec3 edge[3];
     int base = 0;
     for (int i = 0; i < 3; ++i)
     {
-        for (int a = 0; a < 3; ++a)
-            edge[i][a] = (double)p[(i + 1) % 3][a] - p[i][a];
+        edge[i] = p[(i + 1) % 3] - p[i];
         if (Length(edge[i]) > Length(edge[base]))
             base = i;
     }
+    // The longest edge lies on the x axis from corner i to corner j; corner k sits above it.
     int i = base, j = (base + 1) % 3, k = (base + 2) % 3;
     double length = Length(edge[i]);
     double x[3] = {0, 0, 0}, y[3] = {0, 0, 0};
     if (length > 0)
     {
-        const double* e = edge[i];
-        double d[3] = {-edge[k][0], -edge[k][1], -edge[k][2]};   // from corner i to corner k
-        double cross[3] = {e[1] * d[2] - e[2] * d[1], e[2] * d[0] - e[0] * d[2], e[0] * d[1] - e[1] * d[0]};
+        const Vec3 toK = edge[k] * -1.0;   // from corner i to corner k
         x[j] = length;
-        x[k] = (e[0] * d[0] + e[1] * d[1] + e[2] * d[2]) / length;
-        y[k] = Length(cross) / length;
+        x[k] = Dot(edge[i], toK) / length;
+        y[k] = Length(Cross(edge[i], toK)) / length;
     }
     double minX = x[k] < 0 ? x[k] : 0;
     double width = (x[k] > length ? x[k] : length) - minX;
