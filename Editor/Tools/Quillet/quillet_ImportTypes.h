@@ -19,8 +19,10 @@ typedef void* HANDLE;
 typedef void* HMODULE_impl;
 typedef void* HKEY_impl;
 
-typedef void (*_PVFV)();
-typedef int (*_PIFV)();
+// Start-up table entries are DLL code: called with the Windows x64 convention, so the caller
+// reserves their 32-byte home area and keeps nothing it needs in registers they may change.
+typedef void(QUILLET_WINAPI* _PVFV)();
+typedef int(QUILLET_WINAPI* _PIFV)();
 typedef _PIFV _onexit_t;
 
 // A Windows critical section (40 bytes on x64) is used in place as a host recursive mutex.

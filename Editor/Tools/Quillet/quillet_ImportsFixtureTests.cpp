@@ -43,6 +43,25 @@ namespace
             fflush(stdout);
         }
     }
+
+    // Loads Initterm.dll and prints "<export>=<result>" for its two register checks.
+    void RunInittermChecks()
+    {
+        const char* error = nullptr;
+        PEModule* module = PELoadLibrary(CHARTBAKE_FIXTURE_DIR "/Initterm.dll", nullptr, 0, &error);
+        if (!module)
+        {
+            printf("load failed: %s\n", error ? error : "(no message)");
+            return;
+        }
+        PESetupFS();
+        for (const char* name : {"Initterm_CheckRegisters", "InittermE_CheckRegisters"})
+        {
+            AreaTest check = reinterpret_cast<AreaTest>(PEGetProcAddress(module, name));
+            printf("%s=%d\n", name, check ? check() : -1);
+            fflush(stdout);
+        }
+    }
 }
 
 INTEGRATION_TEST_SUITE(QuilletImportsFixture)
@@ -62,5 +81,14 @@ INTEGRATION_TEST_SUITE(QuilletImportsFixture)
             if (result.out.find(expected) == std::string::npos)
                 CHECK_EQUAL(expected, result.out);
         }
+    }
+
+    // Start-up functions that spill into their home area must not break the registers the
+    // Windows convention keeps: rbx, rbp, rdi, rsi, r12-r15, xmm6-xmm15 (checked in the fixture).
+    TEST(InittermStartupFunctions_GetAHomeArea_AndEveryCalleeSavedRegisterSurvives)
+    {
+        Testing::ChildResult result = Testing::RunInChildProcess(&RunInittermChecks);
+        CHECK(result.exited);
+        CHECK_EQUAL("Initterm_CheckRegisters=0\nInittermE_CheckRegisters=0\n", result.out);
     }
 }

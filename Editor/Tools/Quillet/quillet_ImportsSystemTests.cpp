@@ -31,16 +31,16 @@ namespace
         int32_t high;
     };
 
-    // Start-up table entries that record the order they ran in.
+    // Start-up table entries that record the order they ran in; DLL code, so Windows x64 functions.
     std::vector<int> s_Calls;
-    void First() { s_Calls.push_back(1); }
-    void Second() { s_Calls.push_back(2); }
-    int ReturnsFive() { s_Calls.push_back(5); return 5; }
-    int ReturnsZero() { s_Calls.push_back(0); return 0; }
-    int ReturnsSeven() { s_Calls.push_back(7); return 7; }
+    __attribute__((ms_abi)) void First() { s_Calls.push_back(1); }
+    __attribute__((ms_abi)) void Second() { s_Calls.push_back(2); }
+    __attribute__((ms_abi)) int ReturnsFive() { s_Calls.push_back(5); return 5; }
+    __attribute__((ms_abi)) int ReturnsZero() { s_Calls.push_back(0); return 0; }
+    __attribute__((ms_abi)) int ReturnsSeven() { s_Calls.push_back(7); return 7; }
 
-    typedef int (*IntFunction)();
-    typedef void (*VoidFunction)();
+    typedef int(__attribute__((ms_abi)) * IntFunction)();
+    typedef void(__attribute__((ms_abi)) * VoidFunction)();
 
     int InittermE(std::vector<IntFunction> table)
     {
