@@ -10,11 +10,12 @@ namespace
     const double kGapSlack = 1.0 / (1 << 22);
 
     // Stable least-significant-digit radix sort of chart numbers by descending height (the bits of
-    // a non-negative float order like the float).
+    // a non-negative float order like the float). Byte digits: the 1 KiB of counters costs nothing
+    // to clear, where 16-bit digits would touch 256 KiB of fresh memory for every sort.
     bool SortTallestFirst(const ChartBox* boxes, uint32_t n, uint32_t* order)
     {
         Scratch<uint32_t> keys, other, count;
-        if (!keys.Allocate(n) || !other.Allocate(n) || !count.Allocate(65537))
+        if (!keys.Allocate(n) || !other.Allocate(n) || !count.Allocate(257))
             return false;
         for (uint32_t c = 0; c < n; ++c)
         {
@@ -26,20 +27,20 @@ namespace
         }
         uint32_t* from = order;
         uint32_t* to = other.Data();
-        for (int shift = 0; shift < 32; shift += 16)
+        for (int shift = 0; shift < 32; shift += 8)
         {
-            memset(count.Data(), 0, 65537 * sizeof(uint32_t));
+            memset(count.Data(), 0, 257 * sizeof(uint32_t));
             for (uint32_t i = 0; i < n; ++i)
-                ++count[((keys[from[i]] >> shift) & 0xFFFF) + 1];
-            for (uint32_t d = 0; d < 65536; ++d)
+                ++count[((keys[from[i]] >> shift) & 0xFF) + 1];
+            for (uint32_t d = 0; d < 256; ++d)
                 count[d + 1] += count[d];
             for (uint32_t i = 0; i < n; ++i)
-                to[count[(keys[from[i]] >> shift) & 0xFFFF]++] = from[i];
+                to[count[(keys[from[i]] >> shift) & 0xFF]++] = from[i];
             uint32_t* swap = from;
             from = to;
             to = swap;
         }
-        return true;   // two passes: the result is back in `order`
+        return true;   // an even number of passes: the result is back in `order`
     }
 
     // Lays the charts out in rows at `scale`, taking them in the order of `sorted` (the boxes

@@ -5,6 +5,7 @@
 #include <strings.h>
 #include <sys/mman.h>
 
+#include "Editor/Tools/Quillet/quillet_ExecMemory.h"
 #include "Editor/Tools/Quillet/quillet_PEFormat.h"
 
 FailedImportProcPtr s_FailedProcPtr = nullptr;
@@ -17,11 +18,22 @@ __attribute__((ms_abi)) uint64_t FailedImportProcImpl(const char* func)
 
 namespace
 {
+    unsigned char FoldAscii(unsigned char c) { return c >= 'A' && c <= 'Z' ? c + ('a' - 'A') : c; }
+
+    // True when strcasecmp cannot find the names equal: their ASCII first letters already differ.
+    // Bytes above 0x7F are left to strcasecmp, whose folding of them depends on the locale.
+    bool FirstLettersDiffer(const char* a, const char* b)
+    {
+        const unsigned char x = static_cast<unsigned char>(a[0]), y = static_cast<unsigned char>(b[0]);
+        return x < 0x80 && y < 0x80 && FoldAscii(x) != FoldAscii(y);
+    }
+
+    // The specified linear scan; the first-letter test only spares most strcasecmp calls.
     bool SearchTable(const char* name, const PEKnownImport* table, uint64_t count, void** outFunc)
     {
         for (uint64_t i = 0; i < count; ++i)
         {
-            if (strcasecmp(table[i].name, name) == 0)
+            if (!FirstLettersDiffer(table[i].name, name) && strcasecmp(table[i].name, name) == 0)
             {
                 *outFunc = table[i].func;
                 return true;
@@ -47,13 +59,13 @@ namespace
 
     const char* MapThunkArea(PEModule& module)
     {
-        void* area = MapExecMemory(kThunkAreaSize);
+        // Filled with 0xCC already, without touching its pages here (see MapBreakpointMemory).
+        void* area = MapBreakpointMemory(kThunkAreaSize);
         if (area == MAP_FAILED)
             return "Failed to load DLL: could not allocate memory for import stubs";
         module.thunks = static_cast<uint8_t*>(area);
         module.thunksCurr = module.thunks;
         module.thunksSize = kThunkAreaSize;
-        memset(area, 0xCC, kThunkAreaSize);
         s_FailedProcPtr = FailedImportProcImpl;
         return nullptr;
     }

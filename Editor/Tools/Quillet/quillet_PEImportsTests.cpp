@@ -151,6 +151,28 @@ UNIT_TEST_SUITE(PEImports)
         PEFreeLibrary(module);
     }
 
+    // Loading costs no fill of the area: only the page holding the stubs becomes the module's own,
+    // and a second module's area still reads 0xCC where the first wrote stubs.
+    TEST(StubArea_OnlyWrittenPagesBecomePrivate_ModulesDoNotShareStubs)
+    {
+        StdoutCapture capture;
+        PEModule* first = PELoadLibrary(FixturePath("Bound.dll").c_str(), nullptr, 0, nullptr);
+        PEModule* second = PELoadLibrary(FixturePath("Bound.dll").c_str(), kBoundTable, 2, nullptr);
+        capture.Text();
+        CHECK(first && second);
+        if (first && second)
+        {
+            const long kb = PrivateKilobytes(first->thunks);
+            CHECK(kb >= 4 && kb <= 8);
+            CHECK(HasExecMapping(first->thunks, first->thunksSize));
+            // The first has two stubs, the second one: the bytes behind it are still breakpoints.
+            CHECK_EQUAL(0xCC, second->thunks[kImportThunkSize]);
+            CHECK_EQUAL(0x48, first->thunks[kImportThunkSize]);
+        }
+        PEFreeLibrary(first);
+        PEFreeLibrary(second);
+    }
+
     TEST(CallingAnUnresolvedImport_ReportsIt_AndReturnsToTheDll)
     {
         PEModule* module = nullptr;

@@ -122,6 +122,25 @@ namespace PELoaderTest
         return false;
     }
 
+    // Kilobytes of the mapping that starts at `start` that belong to this process alone (its
+    // "Anonymous" figure in /proc/self/smaps: pages written or copied on write); -1 when no
+    // mapping starts there.
+    inline long PrivateKilobytes(const void* start)
+    {
+        std::ifstream smaps("/proc/self/smaps");
+        bool inside = false;
+        for (std::string line; std::getline(smaps, line);)
+        {
+            unsigned long long a = 0, b = 0;
+            long kb = 0;
+            if (sscanf(line.c_str(), "%llx-%llx ", &a, &b) == 2 && line.find(':') > line.find(' '))
+                inside = a == reinterpret_cast<uint64_t>(start);
+            else if (inside && sscanf(line.c_str(), "Anonymous: %ld kB", &kb) == 1)
+                return kb;
+        }
+        return -1;
+    }
+
     inline size_t CountExecMappings()
     {
         size_t n = 0;
