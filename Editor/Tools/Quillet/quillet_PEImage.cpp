@@ -22,7 +22,7 @@ namespace
     }
 
     const char* CopySection(const ByteView& file, const MutableByteView& image, uint64_t entry,
-                            const PE_IMAGE_SECTION_HEADER& section, int32_t sectionAlignment)
+                            const PE_IMAGE_SECTION_HEADER& section, int32_t sectionAlignment, PEFilledRanges& filled)
     {
         const char* outside = "Failed to load DLL: section outside the image";
         uint8_t* dst = nullptr;
@@ -33,7 +33,9 @@ namespace
             dst = image.At(section.VirtualAddress, static_cast<uint64_t>(sectionAlignment));
             if (!dst)
                 return outside;
-            memset(dst, 0, static_cast<size_t>(sectionAlignment));
+            // Zero-filled: only the parts that earlier copies wrote can hold anything else.
+            filled.ForEachInside(section.VirtualAddress, static_cast<uint64_t>(sectionAlignment),
+                                 [&](uint64_t offset, uint64_t length) { memset(image.Base() + offset, 0, length); });
         }
         else
         {
@@ -41,6 +43,7 @@ namespace
                                               section.SizeOfRawData, "Failed to load DLL: section data outside the file", outside))
                 return error;
             dst = image.Base() + section.VirtualAddress;
+            filled.Add(section.VirtualAddress, section.SizeOfRawData);
         }
         // The low half of the mapped address, as the field is only 32 bits wide.
         image.Write<uint32_t>(entry + kMiscOffset, static_cast<uint32_t>(reinterpret_cast<uint64_t>(dst)));
@@ -48,8 +51,12 @@ namespace
     }
 
     const char* RelocateBlock(const MutableByteView& image, uint64_t block, const PE_IMAGE_BASE_RELOCATION& header,
-                              uint64_t locDelta)
+                              uint64_t locDelta, PEFilledRanges& filled)
     {
+        if (!image.Contains(block, header.sizeOfBlock))
+            return "Failed to load DLL: relocation block outside the image";
+        if (!filled.Covers(block, header.sizeOfBlock))
+            return "Failed to load DLL: relocation block outside the file's data";
         const uint64_t entries = (header.sizeOfBlock - sizeof(PE_IMAGE_BASE_RELOCATION)) / 2;
         for (uint64_t i = 0; i < entries; ++i)
         {
@@ -64,6 +71,8 @@ namespace
             uint64_t value = 0;
             if (!image.Read(target, value))
                 return "Failed to load DLL: relocation target outside the image";
+            if (!filled.Covers(target, sizeof value))
+                return "Failed to load DLL: relocation target outside the file's data";
             image.Write(target, value + locDelta);
         }
         return nullptr;
@@ -94,13 +103,15 @@ const char* ReadFileHeaders(const ByteView& file, PEFileHeaders& out)
     return nullptr;
 }
 
-const char* CopyHeaders(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers)
+const char* CopyHeaders(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers,
+                        PEFilledRanges& filled)
 {
     // The DOS part comes along: the length is the NT offset plus SizeOfHeaders, summed in 32 bits.
     const uint32_t length = static_cast<uint32_t>(headers.ntOffset) + headers.nt.OptionalHeader.SizeOfHeaders;
     if (const char* error = CopyBlock(file, 0, image, 0, length, "Failed to load DLL: headers outside the file",
                                       "Failed to load DLL: headers outside the image"))
         return error;
+    filled.Add(0, length);
     if (!image.Contains(headers.ntOffset, sizeof(PE_IMAGE_NT_HEADERS)))
         return "Failed to load DLL: headers outside the image";
     const uint64_t base = reinterpret_cast<uint64_t>(image.Base());
@@ -108,9 +119,11 @@ const char* CopyHeaders(const ByteView& file, const MutableByteView& image, cons
     return nullptr;
 }
 
-const char* CopySections(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers)
+const char* CopySections(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers,
+                         PEFilledRanges& filled)
 {
     const int32_t sectionAlignment = static_cast<int32_t>(headers.nt.OptionalHeader.SectionAlignment);
+    uint64_t rawBytes = 0;
     const uint64_t fileHeader = headers.ntOffset + offsetof(PE_IMAGE_NT_HEADERS, FileHeader);
     // The count and the table position are re-read from the mapped headers on every pass, as a
     // section may be placed over them.
@@ -126,12 +139,15 @@ const char* CopySections(const ByteView& file, const MutableByteView& image, con
         PE_IMAGE_SECTION_HEADER section{};
         if (!image.Read(entry, section))
             return "Failed to load DLL: section table outside the image";
-        if (const char* error = CopySection(file, image, entry, section, sectionAlignment))
+        rawBytes += section.SizeOfRawData;
+        if (rawBytes > file.Size())
+            return "Failed to load DLL: sections hold more raw data than the file";
+        if (const char* error = CopySection(file, image, entry, section, sectionAlignment, filled))
             return error;
     }
 }
 
-const char* DoRelocation(const MutableByteView& image, uint64_t ntOffset, uint64_t locDelta)
+const char* DoRelocation(const MutableByteView& image, uint64_t ntOffset, uint64_t locDelta, PEFilledRanges& filled)
 {
     PE_IMAGE_DATA_DIRECTORY dir{};
     if (!image.Read(ntOffset + PEDataDirectoryOffset(kPEDirectoryBaseRelocations), dir))
@@ -148,7 +164,7 @@ const char* DoRelocation(const MutableByteView& image, uint64_t ntOffset, uint64
             return nullptr;
         if (header.sizeOfBlock < sizeof(PE_IMAGE_BASE_RELOCATION))
             return "Failed to load DLL: relocation block smaller than its header";
-        if (const char* error = RelocateBlock(image, block, header, locDelta))
+        if (const char* error = RelocateBlock(image, block, header, locDelta, filled))
             return error;
         block += header.sizeOfBlock;
     }

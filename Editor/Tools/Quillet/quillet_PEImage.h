@@ -6,6 +6,7 @@
 #include <stdint.h>
 
 #include "Editor/Tools/Quillet/quillet_ByteView.h"
+#include "Editor/Tools/Quillet/quillet_PEFilledRanges.h"
 #include "Editor/Tools/Quillet/quillet_PEFormat.h"
 
 // What the loader takes from the caller's headers before anything is mapped.
@@ -18,13 +19,24 @@ struct PEFileHeaders
 // The checks made before mapping: size, DOS magic, NT signature, PE32+ magic.
 const char* ReadFileHeaders(const ByteView& file, PEFileHeaders& out);
 
-// Copies the headers (including the DOS part before them) and records the mapped base.
-const char* CopyHeaders(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers);
+// Copies the headers (including the DOS part before them) and records the mapped base. Adds the
+// copied bytes to `filled`.
+const char* CopyHeaders(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers,
+                        PEFilledRanges& filled);
 
-const char* CopySections(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers);
+// Copies each section's raw data (adding it to `filled`) or zeroes a section without any. Only
+// filled bytes are ever zeroed: the rest of the mapping is zero already. Beyond the specified
+// step, refuses sections whose raw data add up to more than the file holds (no real image
+// shares raw data between sections), so the bytes written stay within the file's size.
+const char* CopySections(const ByteView& file, const MutableByteView& image, const PEFileHeaders& headers,
+                         PEFilledRanges& filled);
 
 // Adds `locDelta` to every DIR64 and HIGHLOW target named by the mapped base-relocation blocks.
-const char* DoRelocation(const MutableByteView& image, uint64_t ntOffset, uint64_t locDelta);
+// Beyond the specified step, every block must lie wholly inside the image and inside `filled`
+// (checked before any of its entries is used), and so must every target: a block or target in
+// never-filled space could only ever be zero, and walking it would cost time and memory in
+// proportion to SizeOfImage.
+const char* DoRelocation(const MutableByteView& image, uint64_t ntOffset, uint64_t locDelta, PEFilledRanges& filled);
 
 // Checks that the export directory and its three arrays lie inside the mapped image.
 const char* CheckExports(const MutableByteView& image, uint64_t ntOffset);

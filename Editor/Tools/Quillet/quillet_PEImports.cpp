@@ -94,7 +94,8 @@ namespace
     }
 
     const char* BindDescriptor(const MutableByteView& image, const PE_IMAGE_IMPORT_DESCRIPTOR& desc,
-                               ThunkArea& thunks, const PEKnownImport* imports, uint32_t importCount)
+                               ThunkArea& thunks, const PEKnownImport* imports, uint32_t importCount,
+                               uint64_t& entriesLeft)
     {
         uint64_t lookup = desc.OriginalFirstThunk ? desc.OriginalFirstThunk : desc.FirstThunk;
         uint64_t address = desc.FirstThunk;
@@ -105,6 +106,8 @@ namespace
                 return "Failed to load DLL: import lookup table outside the image";
             if (entry == 0)
                 return nullptr;
+            if (entriesLeft-- == 0)
+                return "Failed to load DLL: more import entries than the file holds";
             if (const char* error = BindImport(image, entry, address + 8 * i, thunks, imports, importCount))
                 return error;
         }
@@ -135,7 +138,7 @@ void PECreateImportThunk(uint8_t* dest, const char* name)
 }
 
 const char* ProcessImports(PEModule& module, const MutableByteView& image, uint64_t ntOffset,
-                           const PEKnownImport* imports, uint32_t importCount)
+                           const PEKnownImport* imports, uint32_t importCount, uint64_t maxEntries)
 {
     PE_IMAGE_DATA_DIRECTORY dir{};
     if (!image.Read(ntOffset + PEDataDirectoryOffset(kPEDirectoryImports), dir))
@@ -155,7 +158,7 @@ const char* ProcessImports(PEModule& module, const MutableByteView& image, uint6
             return "Failed to load DLL: import descriptor outside the image";
         if (desc.Name == 0)
             return nullptr;
-        if (const char* error = BindDescriptor(image, desc, thunks, imports, importCount))
+        if (const char* error = BindDescriptor(image, desc, thunks, imports, importCount, maxEntries))
             return error;
     }
 }

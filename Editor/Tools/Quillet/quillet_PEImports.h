@@ -34,5 +34,8 @@ void PECreateImportThunk(uint8_t* dest, const char* name);
 
 // Binds every import of the mapped image `image` of `module`, mapping its stub area when it has
 // an import directory (prints "  No imports" when it has none). Returns an error message or null.
+// Beyond the specified step, refuses an image whose descriptors name more than `maxEntries`
+// import entries in all: a real image's lookup lists do not overlap, so they cannot hold more
+// entries than the file has words, while overlapping lists would multiply the binding work.
 const char* ProcessImports(PEModule& module, const MutableByteView& image, uint64_t ntOffset,
-                           const PEKnownImport* imports, uint32_t importCount);
+                           const PEKnownImport* imports, uint32_t importCount, uint64_t maxEntries);

@@ -29,16 +29,19 @@ namespace
                            const PEKnownImport* imports, uint32_t importCount)
     {
         MutableByteView image(module.codeBase, module.codeSize);
-        if (const char* error = CopyHeaders(file, image, headers))
+        PEFilledRanges filled;  // what the file wrote into the image: all other bytes are zero
+        if (const char* error = CopyHeaders(file, image, headers, filled))
             return error;
         module.headers = reinterpret_cast<PE_IMAGE_NT_HEADERS*>(module.codeBase + headers.ntOffset);
-        if (const char* error = CopySections(file, image, headers))
+        if (const char* error = CopySections(file, image, headers, filled))
             return error;
         // Wraps when the block lies below the preferred base; adding it wraps back.
         const uint64_t locDelta = reinterpret_cast<uint64_t>(module.codeBase) - headers.nt.OptionalHeader.ImageBase;
-        if (const char* error = DoRelocation(image, headers.ntOffset, locDelta))
+        if (const char* error = DoRelocation(image, headers.ntOffset, locDelta, filled))
             return error;
-        if (const char* error = ProcessImports(module, image, headers.ntOffset, imports, importCount))
+        // As many import entries as the file has 8-byte words: more means lists that overlap.
+        const uint64_t maxImportEntries = file.Size() / sizeof(uint64_t);
+        if (const char* error = ProcessImports(module, image, headers.ntOffset, imports, importCount, maxImportEntries))
             return error;
         if (const char* error = CheckExports(image, headers.ntOffset))
             return error;

@@ -1,5 +1,7 @@
 #include "Runtime/Testing/Testing.h"
 
+#include <sys/resource.h>
+
 #include <functional>
 
 #include "Editor/Tools/Quillet/quillet_PEImports.h"
@@ -95,6 +97,19 @@ namespace
          "Failed to load DLL: export table outside the image"},
         {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(i.OptionalField(16), 0x5000); },
          "Failed to load DLL: entry point outside the image"},
+        // Beyond the format's own limits: work is refused on bytes the file never filled. The
+        // relocation section holds 0x200 raw bytes at 0x4000; .data 0x200 at 0x3000.
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(RelocationBlockOffset(i) + 4, 0x400); },
+         "Failed to load DLL: relocation block outside the file's data"},
+        {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(RelocationBlockOffset(i), 0x3400); },
+         "Failed to load DLL: relocation target outside the file's data"},
+        // .data takes the whole file as its raw data: more than the file holds in all.
+        {"EntryRecord.dll",
+         [](RawImage& i) {
+             i.Patch<uint32_t>(i.SectionOffset(2) + 20, 0);
+             i.Patch<uint32_t>(i.SectionOffset(2) + 16, static_cast<uint32_t>(i.bytes.size()));
+         },
+         "Failed to load DLL: sections hold more raw data than the file"},
     };
 }
 
@@ -116,6 +131,58 @@ UNIT_TEST_SUITE(PELoaderFailures)
             CHECK_EQUAL(mappingsBefore, CountExecMappings());
             PEFreeLibrary(result.module);
         }
+    }
+
+    // Four descriptors share one lookup list: more entries than the file has words. Two still
+    // fit, as any image whose lists do not overlap does.
+    TEST(ImportListsThatOverlapBeyondTheFilesSize_AreRefused)
+    {
+        StdoutCapture capture;
+        LoadResult two = Load(BuildImportImage(100, 2));
+        LoadResult four = Load(BuildImportImage(100, 4));
+        capture.Text();
+        CHECK_EQUAL("(null)", two.message);
+        CHECK_EQUAL("Failed to load DLL: more import entries than the file holds", four.message);
+        if (two.module)
+            CHECK(two.module->thunksCurr == two.module->thunks + 200 * kImportThunkSize);
+        PEFreeLibrary(two.module);
+        PEFreeLibrary(four.module);
+    }
+
+    // Small files declaring huge images: the load touches only what the file fills. Measured in a
+    // child as page faults (every page first touched, even only read, faults once): a zeroed or
+    // walked gigabyte would cost a quarter of a million.
+    TEST(HugeImages_FromSmallFiles_TouchOnlyWhatTheFileFills)
+    {
+        RawImage zeroed = ReadFixture("Args.dll");  // its .data has no raw data: a zeroed section
+        zeroed.Patch<uint32_t>(zeroed.OptionalField(56), 0x40000000);  // SizeOfImage 1 GiB
+        zeroed.Patch<uint32_t>(zeroed.OptionalField(32), 0x20000000);  // SectionAlignment 512 MiB
+        LoadCost cost = MeasureLoad(zeroed.bytes);
+        CHECK_EQUAL("(null)", cost.message);
+        CHECK(cost.pageFaults < 2000);
+
+        RawImage walked = ReadFixture("EntryRecord.dll");
+        walked.Patch<uint32_t>(walked.OptionalField(56), 0x40000000);
+        walked.Patch<uint32_t>(RelocationBlockOffset(walked) + 4, 0x20000000);  // a 512 MiB block
+        cost = MeasureLoad(walked.bytes);
+        CHECK_EQUAL("Failed to load DLL: relocation block outside the file's data", cost.message);
+        CHECK(cost.pageFaults < 2000);
+    }
+
+    // An image larger than the address space left to the process: refused with the mapping's
+    // message, not a crash.
+    TEST(SizeOfImageThatCannotBeMapped_FailsWithAMessage)
+    {
+        RawImage image = ReadFixture("EntryRecord.dll");
+        image.Patch<uint32_t>(image.OptionalField(56), 0xFFFFF000);
+        Testing::ChildResult result = Testing::RunInChildProcess([&image] {
+            rlimit limit{};
+            getrlimit(RLIMIT_AS, &limit);
+            limit.rlim_cur = 1ull << 31;  // 2 GiB of address space: the image needs 4
+            setrlimit(RLIMIT_AS, &limit);
+            printf("%s\n", Load(image.bytes).message.c_str());
+        });
+        CHECK_EQUAL("Failed to load DLL: could not allocate memory for executable\n", result.out);
     }
 
     TEST(SixtyFourBytesOfDosHeader_PassTheSizeCheck)

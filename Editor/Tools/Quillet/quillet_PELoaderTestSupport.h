@@ -6,6 +6,8 @@
 #include <stdio.h>
 #include <string.h>
 
+#include <stdlib.h>
+#include <sys/resource.h>
 #include <unistd.h>
 
 #include <fstream>
@@ -17,6 +19,7 @@
 #include "Editor/Tools/Quillet/quillet_ByteView.h"
 #include "Editor/Tools/Quillet/quillet_PEFormat.h"
 #include "Editor/Tools/Quillet/quillet_PELoader.h"
+#include "Runtime/Testing/ChildProcess.h"
 
 namespace PELoaderTest
 {
@@ -96,6 +99,35 @@ namespace PELoaderTest
         return {module, message ? message : "(null)"};
     }
 
+    struct LoadCost
+    {
+        long pageFaults = -1;  // minor and major page faults taken by the load
+        std::string message;   // as LoadResult::message
+    };
+
+    // Loads `bytes` in a child process (the module, if any, dies with it) and counts the page
+    // faults the load takes: a count of pages touched that does not depend on timing.
+    inline LoadCost MeasureLoad(const std::vector<uint8_t>& bytes)
+    {
+        Testing::ChildResult child = Testing::RunInChildProcess([&bytes] {
+            rusage before{}, after{};
+            getrusage(RUSAGE_SELF, &before);
+            const char* message = "not written";
+            PELoadLibrary(bytes.data(), bytes.size(), nullptr, 0, &message);
+            getrusage(RUSAGE_SELF, &after);
+            printf("\nfaults=%ld message=%s\n", (after.ru_minflt - before.ru_minflt) + (after.ru_majflt - before.ru_majflt),
+                   message ? message : "(null)");
+        });
+        LoadCost cost;
+        const size_t at = child.out.rfind("\nfaults=");
+        if (!child.exited || at == std::string::npos)
+            return cost;
+        const size_t text = child.out.find(" message=", at);
+        cost.pageFaults = atol(child.out.c_str() + at + 8);
+        cost.message = child.out.substr(text + 9, child.out.size() - text - 10);
+        return cost;
+    }
+
     // The lines of /proc/self/maps.
     inline std::vector<std::string> Mappings()
     {
@@ -150,13 +182,14 @@ namespace PELoaderTest
     }
 
     // A minimal well-formed PE32+ image built by hand: headers in the first 0x200 file bytes, one
-    // section at image offset 0x1000 holding the entry point (xor eax, eax; ret), one import
-    // descriptor whose `importCount` lookup entries all name "Nowhere_Function", and its
-    // address table. No relocations, no exports.
-    inline std::vector<uint8_t> BuildImportImage(uint32_t importCount)
+    // section at image offset 0x1000 holding the entry point (xor eax, eax; ret), `descriptors`
+    // import descriptors that all share one lookup list of `importCount` entries, each naming
+    // "Nowhere_Function", and one address table. No relocations, no exports.
+    inline std::vector<uint8_t> BuildImportImage(uint32_t importCount, uint32_t descriptors = 1)
     {
         const uint32_t kSectionRva = 0x1000, kFileAlign = 0x200;
-        const uint32_t descriptorAt = 0x10, nameAt = 0x40, lookupAt = 0x80;
+        const uint32_t descriptorAt = 0x10;
+        const uint32_t nameAt = descriptorAt + 20 * (descriptors + 1) + 4, lookupAt = nameAt + 0x40;
         const uint32_t addressAt = lookupAt + 8 * (importCount + 1);
         const uint32_t dataSize = addressAt + 8 * (importCount + 1);
         const uint32_t rawSize = (dataSize + kFileAlign - 1) & ~(kFileAlign - 1);
@@ -182,7 +215,7 @@ namespace PELoaderTest
         opt.SizeOfImage = kSectionRva + ((dataSize + 0xFFF) & ~0xFFFu);
         opt.SizeOfHeaders = kFileAlign;
         opt.NumberOfRvaAndSizes = 16;
-        opt.DataDirectory[kPEDirectoryImports] = {kSectionRva + descriptorAt, 2 * sizeof(PE_IMAGE_IMPORT_DESCRIPTOR)};
+        opt.DataDirectory[kPEDirectoryImports] = {kSectionRva + descriptorAt, (descriptors + 1) * uint32_t(sizeof(PE_IMAGE_IMPORT_DESCRIPTOR))};
         file.Write(0x40, nt);
         PE_IMAGE_SECTION_HEADER section{};
         memcpy(section.Name, ".data", 5);
@@ -200,7 +233,8 @@ namespace PELoaderTest
         desc.OriginalFirstThunk = kSectionRva + lookupAt;
         desc.Name = kSectionRva + nameAt;  // the DLL name; any string serves
         desc.FirstThunk = kSectionRva + addressAt;
-        file.Write(data + descriptorAt, desc);
+        for (uint32_t d = 0; d < descriptors; ++d)
+            file.Write(data + descriptorAt + d * sizeof(desc), desc);
         memcpy(bytes.data() + data + nameAt + 2, "Nowhere_Function", 17);
         for (uint32_t i = 0; i < importCount; ++i)
         {
