@@ -160,4 +160,23 @@ UNIT_TEST_SUITE(QuilletImportsMemory)
         CHECK(IsMapped(PageAt(base, 1)));
         munmap(PageAt(base, 1), kPage);
     }
+
+    // A second mapping at an address that still has a record leaves the old length in place: the
+    // release then unmaps the old, longer length. (The first mapping is removed behind the
+    // record's back so that mmap hands the same address out again.)
+    TEST(VirtualAlloc_AtARecordedAddress_KeepsTheRecordedLength)
+    {
+        VirtualMemory vm;
+        char* base = static_cast<char*>(vm.alloc(nullptr, 2 * kPage, kMemReserve, kPageReadWrite));
+        CHECK(base != MAP_FAILED);
+        munmap(base, 2 * kPage);
+        char* again = static_cast<char*>(vm.alloc(base, kPage, kMemReserve, kPageReadWrite));
+        void* second = mmap(PageAt(base, 1), kPage, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_FIXED_NOREPLACE, -1, 0);
+        CHECK(again == base && second == PageAt(base, 1));
+        if (again != base || second != PageAt(base, 1))
+            return;
+        CHECK_EQUAL(1, vm.free(base, 0, kMemRelease));
+        CHECK(!IsMapped(PageAt(base, 0)));
+        CHECK(!IsMapped(PageAt(base, 1)));  // two pages: the first record's length
+    }
 }

@@ -173,6 +173,30 @@ UNIT_TEST_SUITE(PEImports)
         PEFreeLibrary(second);
     }
 
+    // Without a lookup list (OriginalFirstThunk 0) the names are read from the address list.
+    TEST(DescriptorWithoutLookupList_ReadsTheNamesFromTheAddressList)
+    {
+        std::vector<uint8_t> bytes = BuildImportImage(3);
+        const uint64_t descriptor = 0x200 + 0x10;  // first section's file offset + descriptor offset
+        PE_IMAGE_IMPORT_DESCRIPTOR desc{};
+        MutableByteView(bytes.data(), bytes.size()).Read(descriptor, desc);
+        CHECK(desc.OriginalFirstThunk != 0 && desc.FirstThunk != 0);
+        desc.OriginalFirstThunk = 0;
+        MutableByteView(bytes.data(), bytes.size()).Write(descriptor, desc);
+        LoadResult dll = Load(bytes);
+        CHECK_EQUAL("(null)", dll.message);
+        if (!dll.module)
+            return;
+        CHECK(dll.module->thunksCurr == dll.module->thunks + 3 * kImportThunkSize);
+        uint64_t slot = 0;
+        ByteView(dll.module->codeBase, dll.module->codeSize).Read(desc.FirstThunk + 8, slot);
+        CHECK_EQUAL(reinterpret_cast<uint64_t>(dll.module->thunks + kImportThunkSize), slot);
+        uint64_t name = 0;
+        memcpy(&name, dll.module->thunks + 2, 8);
+        CHECK_EQUAL("Nowhere_Function", reinterpret_cast<const char*>(name));
+        PEFreeLibrary(dll.module);
+    }
+
     TEST(CallingAnUnresolvedImport_ReportsIt_AndReturnsToTheDll)
     {
         PEModule* module = nullptr;

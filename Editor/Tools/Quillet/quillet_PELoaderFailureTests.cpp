@@ -1,6 +1,7 @@
 #include "Runtime/Testing/Testing.h"
 
 #include <sys/resource.h>
+#include <sys/stat.h>
 
 #include <functional>
 
@@ -235,6 +236,41 @@ UNIT_TEST_SUITE(PELoaderFailures)
         CHECK(PELoadLibrary(FixturePath("Pe32.dll").c_str(), nullptr, 0, &message) == nullptr);
         CHECK_EQUAL("Failed to load DLL: not a 64 bit DLL", message);
         unlink(path);
+    }
+
+    // A sparse file of 1 GiB with a 512 MiB address-space limit: the buffer cannot be had.
+    TEST(FileForm_FileLargerThanMemoryLeft_CouldNotAllocate)
+    {
+        char dir[] = "/tmp/PELoaderBigXXXXXX";
+        CHECK(mkdtemp(dir) != nullptr);
+        const std::string path = std::string(dir) + "/Big.dll";
+        FILE* big = fopen(path.c_str(), "wb");
+        CHECK(big != nullptr && ftruncate(fileno(big), 1ll << 30) == 0);
+        if (big)
+            fclose(big);
+        Testing::ChildResult result = Testing::RunInChildProcess([&path] {
+            rlimit limit{};
+            getrlimit(RLIMIT_AS, &limit);
+            limit.rlim_cur = 1ull << 29;
+            setrlimit(RLIMIT_AS, &limit);
+            const char* message = kNotRun;
+            PEModule* module = PELoadLibrary(path.c_str(), nullptr, 0, &message);
+            printf("%s %s\n", module ? "module" : "null", message ? message : "(null)");
+        });
+        CHECK_EQUAL("null Failed to load DLL: could not allocate memory for file\n", result.out);
+        unlink(path.c_str());
+        rmdir(dir);
+    }
+
+    // A sysfs file claims a page but holds a few bytes: fewer arrive than its size.
+    TEST(FileForm_FewerBytesThanTheFileSize_CouldNotRead)
+    {
+        const char* shortFile = "/sys/devices/system/cpu/online";
+        struct stat info{};
+        CHECK(stat(shortFile, &info) == 0 && info.st_size == 4096);
+        const char* message = kNotRun;
+        CHECK(PELoadLibrary(shortFile, nullptr, 0, &message) == nullptr);
+        CHECK_EQUAL("Failed to load DLL: could not read file", message);
     }
 
     TEST(UnresolvedImports_FillTheStubAreaExactly_OneMoreFails)

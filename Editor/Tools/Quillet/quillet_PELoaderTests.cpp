@@ -230,6 +230,43 @@ UNIT_TEST_SUITE(PELoaderModules)
         CHECK(PEGetProcAddress(dll.module, "probe_value") == dll.module->codeBase + behind);
     }
 
+    // A forwarder is not followed: its address points at its own text in the export directory.
+    TEST(GetProcAddress_ForwardedExport_IsTheAddressOfItsText)
+    {
+        LoadedFixture dll("GsReader.dll");
+        if (!dll.module)
+            return;
+        const char* text = static_cast<const char*>(PEGetProcAddress(dll.module, "gs_forwarded"));
+        CHECK(text != nullptr);
+        if (!text)
+            return;
+        CHECK_EQUAL("Elsewhere.Forwarded_Function", text);
+        const PE_IMAGE_DATA_DIRECTORY dir = dll.module->headers->OptionalHeader.DataDirectory[kPEDirectoryExports];
+        CHECK(text >= reinterpret_cast<const char*>(dll.module->codeBase) + dir.va);
+        CHECK(text < reinterpret_cast<const char*>(dll.module->codeBase) + dir.va + dir.size);
+    }
+
+    // Sections are taken in table order: a section without raw data placed over an earlier one
+    // clears what that one copied.
+    TEST(SectionWithoutRawData_OverAnEarlierSection_ClearsIt)
+    {
+        RawImage raw = ReadFixture("Args.dll");
+        PE_IMAGE_SECTION_HEADER rdata{};
+        raw.View().Read(raw.SectionOffset(1), rdata);
+        raw.Patch<uint32_t>(raw.SectionOffset(2) + 12, rdata.VirtualAddress);  // .data over .rdata
+        StdoutCapture capture;
+        LoadResult dll = Load(raw.bytes);
+        capture.Text();
+        CHECK_EQUAL("(null)", dll.message);
+        if (!dll.module)
+            return;
+        size_t nonZero = 0;
+        for (uint32_t i = 0; i < rdata.SizeOfRawData; ++i)
+            nonZero += dll.module->codeBase[rdata.VirtualAddress + i] != 0;
+        CHECK_EQUAL(0u, nonZero);
+        PEFreeLibrary(dll.module);
+    }
+
     TEST(GetProcAddress_ReadsNothingOutsideTheImage)
     {
         LoadedFixture dll("EntryRecord.dll");

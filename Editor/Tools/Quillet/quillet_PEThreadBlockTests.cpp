@@ -87,4 +87,26 @@ UNIT_TEST_SUITE(PEThreadBlock)
         CHECK(here != 0);
         CHECK_EQUAL(here, there);
     }
+
+    // The loader prepares the block before the entry point runs: the entry point finds the
+    // block's address at 0x30, and what an earlier user left in the block is already wiped.
+    TEST(EntryPoint_RunsWithAFreshBlock)
+    {
+        PESetupFS();
+        ThreadInformationBlock* tib = reinterpret_cast<ThreadInformationBlock*>(ReadGsWord(0x30));
+        tib->lastError = 0x5EED;
+        PEModule* module = nullptr;
+        {
+            StdoutCapture capture;
+            module = PELoadLibrary(FixturePath("GsReader.dll").c_str(), nullptr, 0, nullptr);
+            capture.Text();
+        }
+        CHECK(module != nullptr);
+        if (!module)
+            return;
+        typedef uint32_t(__attribute__((ms_abi)) * WordFn)();
+        CHECK_EQUAL(reinterpret_cast<uint64_t>(tib), reinterpret_cast<GsFn>(PEGetProcAddress(module, "Gs_EntrySaw30"))());
+        CHECK_EQUAL(0u, reinterpret_cast<WordFn>(PEGetProcAddress(module, "Gs_EntrySawLastError"))());
+        PEFreeLibrary(module);
+    }
 }
