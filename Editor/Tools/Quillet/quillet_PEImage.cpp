@@ -170,7 +170,7 @@ const char* DoRelocation(const MutableByteView& image, uint64_t ntOffset, uint64
     }
 }
 
-const char* CheckExports(const MutableByteView& image, uint64_t ntOffset)
+const char* CheckExports(const MutableByteView& image, uint64_t ntOffset, PEFilledRanges& filled)
 {
     PE_IMAGE_DATA_DIRECTORY dir{};
     if (!image.Read(ntOffset + PEDataDirectoryOffset(kPEDirectoryExports), dir))
@@ -184,5 +184,10 @@ const char* CheckExports(const MutableByteView& image, uint64_t ntOffset)
     const bool inside = image.Contains(exports.AddressOfNames, 4ull * exports.NumberOfNames) &&
                         image.Contains(exports.AddressOfNameOrdinals, 2ull * exports.NumberOfNames) &&
                         image.Contains(exports.AddressOfFunctions, 4ull * exports.NumberOfFunctions);
-    return inside ? nullptr : outside;
+    if (!inside)
+        return outside;
+    const bool fromFile = filled.Covers(exports.AddressOfNames, 4ull * exports.NumberOfNames) &&
+                          filled.Covers(exports.AddressOfNameOrdinals, 2ull * exports.NumberOfNames) &&
+                          filled.Covers(exports.AddressOfFunctions, 4ull * exports.NumberOfFunctions);
+    return fromFile ? nullptr : "Failed to load DLL: export table outside the file's data";
 }

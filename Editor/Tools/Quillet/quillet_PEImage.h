@@ -38,5 +38,7 @@ const char* CopySections(const ByteView& file, const MutableByteView& image, con
 // proportion to SizeOfImage.
 const char* DoRelocation(const MutableByteView& image, uint64_t ntOffset, uint64_t locDelta, PEFilledRanges& filled);
 
-// Checks that the export directory and its three arrays lie inside the mapped image.
-const char* CheckExports(const MutableByteView& image, uint64_t ntOffset);
+// Checks that the export directory and its three arrays lie inside the mapped image. Beyond the
+// specified steps, the arrays must also lie in `filled`: look-ups then walk at most as many names
+// as the file holds, however large the image.
+const char* CheckExports(const MutableByteView& image, uint64_t ntOffset, PEFilledRanges& filled);

@@ -10,6 +10,7 @@
 #include "Editor/Tools/Quillet/quillet_PEFormat.h"
 #include "Editor/Tools/Quillet/quillet_PEImage.h"
 #include "Editor/Tools/Quillet/quillet_PEImports.h"
+#include "Editor/Tools/Quillet/quillet_PELoaderInternal.h"
 
 typedef int32_t(__attribute__((ms_abi)) * DllEntryProc)(void* module, uint32_t reason, void* reserved);
 
@@ -43,7 +44,7 @@ namespace
         const uint64_t maxImportEntries = file.Size() / sizeof(uint64_t);
         if (const char* error = ProcessImports(module, image, headers.ntOffset, imports, importCount, maxImportEntries))
             return error;
-        if (const char* error = CheckExports(image, headers.ntOffset))
+        if (const char* error = CheckExports(image, headers.ntOffset, filled))
             return error;
         // A zero entry point is not special; anything past the image is.
         if (headers.nt.OptionalHeader.AddressOfEntryPoint >= module.codeSize)
@@ -52,39 +53,58 @@ namespace
     }
 }
 
+namespace
+{
+    // The memory form's steps; `runEntry` false stops after binding (see quillet_PELoaderInternal.h).
+    PEModule* LoadFromMemory(const void* data, size_t size, const PEKnownImport* imports, uint32_t importCount,
+                             const char** outErrorMsg, bool runEntry)
+    {
+        ByteView file(static_cast<const uint8_t*>(data), data ? size : 0);
+        PEFileHeaders headers{};
+        if (const char* error = ReadFileHeaders(file, headers))
+            return Fail(outErrorMsg, error);
+
+        const size_t mapSize = headers.nt.OptionalHeader.SizeOfImage;
+        void* code = MapExecMemory(mapSize);
+        if (code == MAP_FAILED)
+            return Fail(outErrorMsg, "Failed to load DLL: could not allocate memory for executable");
+        PEModule* module = new (std::nothrow) PEModule{static_cast<uint8_t*>(code), mapSize, nullptr, nullptr, nullptr, 0};
+        if (!module)
+        {
+            UnmapExecMemory(code, mapSize);
+            return Fail(outErrorMsg, "Failed to load DLL: could not allocate memory for executable");
+        }
+
+        const char* error = BuildImage(file, headers, *module, imports, importCount);
+        if (!error && runEntry)
+            error = PESetupFS();
+        if (error)
+        {
+            PEFreeLibrary(module);
+            return Fail(outErrorMsg, error);
+        }
+
+        if (runEntry)
+        {
+            DllEntryProc entry = reinterpret_cast<DllEntryProc>(module->codeBase + headers.nt.OptionalHeader.AddressOfEntryPoint);
+            entry(module->codeBase, kDllProcessAttach, nullptr);
+        }
+        if (outErrorMsg)
+            *outErrorMsg = nullptr;
+        return module;
+    }
+}
+
 PEModule* PELoadLibrary(const void* data, size_t size, const PEKnownImport* imports, uint32_t importCount,
                         const char** outErrorMsg)
 {
-    ByteView file(static_cast<const uint8_t*>(data), data ? size : 0);
-    PEFileHeaders headers{};
-    if (const char* error = ReadFileHeaders(file, headers))
-        return Fail(outErrorMsg, error);
+    return LoadFromMemory(data, size, imports, importCount, outErrorMsg, true);
+}
 
-    const size_t mapSize = headers.nt.OptionalHeader.SizeOfImage;
-    void* code = MapExecMemory(mapSize);
-    if (code == MAP_FAILED)
-        return Fail(outErrorMsg, "Failed to load DLL: could not allocate memory for executable");
-    PEModule* module = new (std::nothrow) PEModule{static_cast<uint8_t*>(code), mapSize, nullptr, nullptr, nullptr, 0};
-    if (!module)
-    {
-        UnmapExecMemory(code, mapSize);
-        return Fail(outErrorMsg, "Failed to load DLL: could not allocate memory for executable");
-    }
-
-    const char* error = BuildImage(file, headers, *module, imports, importCount);
-    if (!error)
-        error = PESetupFS();
-    if (error)
-    {
-        PEFreeLibrary(module);
-        return Fail(outErrorMsg, error);
-    }
-
-    DllEntryProc entry = reinterpret_cast<DllEntryProc>(module->codeBase + headers.nt.OptionalHeader.AddressOfEntryPoint);
-    entry(module->codeBase, kDllProcessAttach, nullptr);
-    if (outErrorMsg)
-        *outErrorMsg = nullptr;
-    return module;
+PEModule* PEMapLibraryWithoutEntry(const void* data, size_t size, const PEKnownImport* imports, uint32_t importCount,
+                                   const char** outErrorMsg)
+{
+    return LoadFromMemory(data, size, imports, importCount, outErrorMsg, false);
 }
 
 PEModule* PELoadLibrary(const char* path, const PEKnownImport* imports, uint32_t importCount, const char** outErrorMsg)

@@ -104,6 +104,14 @@ namespace
          "Failed to load DLL: relocation block outside the file's data"},
         {"EntryRecord.dll", [](RawImage& i) { i.Patch<uint32_t>(RelocationBlockOffset(i), 0x3400); },
          "Failed to load DLL: relocation target outside the file's data"},
+        // A name array of a million entries: inside the image once it is large enough, but not
+        // in the file.
+        {"EntryRecord.dll",
+         [](RawImage& i) {
+             i.Patch<uint32_t>(i.OptionalField(56), 0x1000000);
+             i.Patch<uint32_t>(i.FileOffset(i.Directory(kPEDirectoryExports).va) + 24, 1000000);
+         },
+         "Failed to load DLL: export table outside the file's data"},
         // .data takes the whole file as its raw data: more than the file holds in all.
         {"EntryRecord.dll",
          [](RawImage& i) {

@@ -2,6 +2,7 @@
 
 #include <sys/mman.h>
 
+#include "Editor/Tools/Quillet/quillet_PELoaderInternal.h"
 #include "Editor/Tools/Quillet/quillet_PELoaderTestSupport.h"
 
 using namespace PELoaderTest;
@@ -73,6 +74,25 @@ UNIT_TEST_SUITE(PELoaderModules)
         CHECK_EQUAL(1u, Export<UintFn>(dll.module, "EntryRecord_Reason")());
         CHECK(Export<PtrFn>(dll.module, "EntryRecord_Module")() == m.codeBase);
         CHECK(Export<PtrFn>(dll.module, "EntryRecord_Reserved")() == nullptr);
+    }
+
+    // For tools that must not run DLL code: everything up to binding, then no entry point.
+    TEST(MapWithoutEntry_RelocatesAndExports_ButNeverRunsTheEntryPoint)
+    {
+        RawImage raw = ReadFixture("EntryRecord.dll");
+        StdoutCapture capture;
+        const char* message = "not written";
+        PEModule* module = PEMapLibraryWithoutEntry(raw.bytes.data(), raw.bytes.size(), nullptr, 0, &message);
+        CHECK_EQUAL("  No imports\n", capture.Text());
+        CHECK(module != nullptr && message == nullptr);
+        if (!module)
+            return;
+        CHECK_EQUAL(0, Export<IntFn>(module, "EntryRecord_Calls")());
+        CHECK(Export<PtrFn>(module, "EntryRecord_StoredAddress")() == Export<PtrFn>(module, "EntryRecord_CallsAddress")());
+        PEFreeLibrary(module);
+        message = "not written";
+        CHECK(PEMapLibraryWithoutEntry(raw.bytes.data(), 63, nullptr, 0, &message) == nullptr);
+        CHECK_EQUAL("Failed to load DLL: size smaller than PE header", message);
     }
 
     TEST(MappedHeaders_SitAtTheNtOffset_WithTheMappedBase)
