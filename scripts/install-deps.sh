@@ -3,7 +3,8 @@
 # Safe to run repeatedly: it only calls apt-get when something is missing.
 set -euo pipefail
 
-packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm)
+# libclang-rt-14-dev: the libFuzzer and sanitizer runtimes for scripts/fuzz.sh.
+packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm libclang-rt-14-dev)
 
 missing=()
 for p in "${packages[@]}"; do

@@ -1,0 +1,9 @@
+// LoadFromHalvorBinary on arbitrary bytes: it must read the mesh or refuse it with a message,
+// never crash, leak or run away.
+#include "MeshFuzzing.h"
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
+{
+    ReadMeshFromMemory(&LoadFromHalvorBinary, data, size);
+    return 0;
+}
