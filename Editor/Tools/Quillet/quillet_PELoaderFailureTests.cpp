@@ -146,10 +146,8 @@ UNIT_TEST_SUITE(PELoaderFailures)
     // fit, as any image whose lists do not overlap does.
     TEST(ImportListsThatOverlapBeyondTheFilesSize_AreRefused)
     {
-        StdoutCapture capture;
-        LoadResult two = Load(BuildImportImage(100, 2));
-        LoadResult four = Load(BuildImportImage(100, 4));
-        capture.Text();
+        LoadResult two = LoadQuietly(BuildImportImage(100, 2));
+        LoadResult four = LoadQuietly(BuildImportImage(100, 4));
         CHECK_EQUAL("(null)", two.message);
         CHECK_EQUAL("Failed to load DLL: more import entries than the file holds", four.message);
         if (two.module)

@@ -128,6 +128,9 @@ namespace PELoaderTest
         return cost;
     }
 
+    // Load with standard output (the loader's console lines) captured and dropped.
+    inline LoadResult LoadQuietly(const std::vector<uint8_t>& bytes);
+
     // The lines of /proc/self/maps.
     inline std::vector<std::string> Mappings()
     {
@@ -292,4 +295,12 @@ namespace PELoaderTest
         FILE* m_File;
         int m_Saved = -1;
     };
+
+    inline LoadResult LoadQuietly(const std::vector<uint8_t>& bytes)
+    {
+        StdoutCapture capture;
+        LoadResult result = Load(bytes);
+        capture.Text();
+        return result;
+    }
 }

@@ -152,31 +152,34 @@ namespace
     _PIFV s_Initialisers[] = {&SpillingInitialiser, &SpillingInitialiser};
 }
 
-// Each returns 0 when the start-up functions ran the expected number of times and every
-// callee-saved register survived; else a code naming what went wrong (see FirstChangedRegister;
-// 100 + calls for a wrong count, 200 + result for a wrong _initterm_e result).
+namespace
+{
+    // Calls `function` over [begin, end) with every callee-saved register holding a pattern.
+    // 0 when the start-up functions ran twice, the result (when `result` is not negative) matched
+    // and every callee-saved register survived; else 100 + calls for a wrong count, 200 + result
+    // for a wrong result, or the register code of FirstChangedRegister.
+    int32_t CheckCall(const void* function, const void* begin, const void* end, int32_t result)
+    {
+        Probe probe;
+        g_InittermCalls = 0;
+        Prepare(probe, Address(function), Address(begin), Address(end));
+        CallProbed(&probe);
+        if (g_InittermCalls != 2)
+            return 100 + g_InittermCalls;
+        if (result >= 0 && static_cast<int32_t>(probe.outRax) != result)
+            return 200 + static_cast<int32_t>(probe.outRax);
+        return FirstChangedRegister(probe);
+    }
+}
+
 extern "C" __declspec(dllexport) int32_t Initterm_CheckRegisters()
 {
-    Probe probe;
-    g_InittermCalls = 0;
-    Prepare(probe, Address(reinterpret_cast<const void*>(&_initterm)), Address(s_Constructors), Address(s_Constructors + 3));
-    CallProbed(&probe);
-    if (g_InittermCalls != 2)
-        return 100 + g_InittermCalls;
-    return FirstChangedRegister(probe);
+    return CheckCall(reinterpret_cast<const void*>(&_initterm), s_Constructors, s_Constructors + 3, -1);
 }
 
 extern "C" __declspec(dllexport) int32_t InittermE_CheckRegisters()
 {
-    Probe probe;
-    g_InittermCalls = 0;
-    Prepare(probe, Address(reinterpret_cast<const void*>(&_initterm_e)), Address(s_Initialisers), Address(s_Initialisers + 2));
-    CallProbed(&probe);
-    if (g_InittermCalls != 2)
-        return 100 + g_InittermCalls;
-    if (static_cast<int32_t>(probe.outRax) != 7)
-        return 200 + static_cast<int32_t>(probe.outRax);
-    return FirstChangedRegister(probe);
+    return CheckCall(reinterpret_cast<const void*>(&_initterm_e), s_Initialisers, s_Initialisers + 2, 7);
 }
 
 extern "C" BOOL DllMain(HMODULE, DWORD, void*)
