@@ -160,4 +160,21 @@ UNIT_TEST_SUITE(QuilletImportsMemory)
         CHECK(IsMapped(PageAt(base, 1)));
         munmap(PageAt(base, 1), kPage);
     }
+
+    TEST(VirtualAlloc_AtAnAddressAlreadyRecorded_KeepsTheFirstLength)
+    {
+        VirtualMemory vm;
+        // Three pages, unmapped behind the record's back, then one page mapped again at the same
+        // base: the record still says three pages, so the release unmaps three.
+        char* base = static_cast<char*>(vm.alloc(nullptr, 3 * kPage, kMemReserve, kPageReadWrite));
+        munmap(base, 3 * kPage);
+        char* again = static_cast<char*>(vm.alloc(base, kPage, kMemReserve, kPageReadWrite));
+        CHECK(again == base);
+        void* rest = mmap(PageAt(base, 1), 2 * kPage, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_FIXED_NOREPLACE, -1, 0);
+        CHECK(rest == PageAt(base, 1));
+        CHECK_EQUAL(1, vm.free(again, 0, kMemRelease));
+        CHECK(!IsMapped(PageAt(base, 0)));
+        CHECK(!IsMapped(PageAt(base, 2)));
+        munmap(base, 3 * kPage);
+    }
 }
