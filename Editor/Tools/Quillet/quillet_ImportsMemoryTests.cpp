@@ -170,11 +170,25 @@ UNIT_TEST_SUITE(QuilletImportsMemory)
         munmap(base, 3 * kPage);
         char* again = static_cast<char*>(vm.alloc(base, kPage, kMemReserve, kPageReadWrite));
         CHECK(again == base);
+        CHECK(IsMapped(again));  // a reservation at an address maps (the address is a free hint)
         void* rest = mmap(PageAt(base, 1), 2 * kPage, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_FIXED_NOREPLACE, -1, 0);
         CHECK(rest == PageAt(base, 1));
         CHECK_EQUAL(1, vm.free(again, 0, kMemRelease));
         CHECK(!IsMapped(PageAt(base, 0)));
         CHECK(!IsMapped(PageAt(base, 2)));
         munmap(base, 3 * kPage);
+    }
+
+    TEST(VirtualAlloc_MapsExecutableMemory_AndAZeroSizeFreeReleasesTheRecordedLength)
+    {
+        VirtualMemory vm;
+        // Whatever protection is asked for, the memory runs code: a lone "ret".
+        unsigned char* code = static_cast<unsigned char*>(vm.alloc(nullptr, 2 * kPage, kMemCommit, kPageReadWrite));
+        code[0] = 0xC3;
+        reinterpret_cast<void (*)()>(code)();
+        // Size 0 with a type other than release still takes the recorded length.
+        CHECK_EQUAL(1, vm.free(code, 0, kMemDecommit));
+        CHECK(!IsMapped(PageAt(code, 0)));
+        CHECK(!IsMapped(PageAt(code, 1)));
     }
 }
