@@ -1,11 +1,19 @@
 // Times whole ChartBake runs on a generated mesh of about one million triangles, in both file
-// formats, and shows where the time goes (ChartBake reports its phases with CHARTBAKE_TIMINGS).
+// formats, and shows where the time goes (ChartBake reports its phases with CHARTBAKE_TIMINGS):
+// per run the phases, then the medians of the read phase as MB/s of input and of the peak
+// resident memory at the end of reading over the bytes of the mesh arrays read (positions,
+// triangles and, from OBJ, one UV pair a corner).
 //
 //   ChartBakeBench [triangles=1000000] [runs=3] [-keep <dir>]
 //
 // The mesh is a wavy grid of quads, two triangles each; it is written to a temporary directory
 // (or <dir> with -keep, which also keeps it) as mesh.obj (vertex/uv/normal faces) and mesh.bin.
+// Before timing, the OBJ file is read in-process by LoadFromObj and line by line with fgets and
+// sscanf, both under the driver's rounding toward zero, and every number is compared bit for bit.
+#include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
 #include "Runtime/Testing/ChildProcess.h"
+
+#include <algorithm>
 
 #include <chrono>
 #include <cmath>
@@ -16,6 +24,7 @@
 #include <filesystem>
 #include <string>
 #include <vector>
+#include <xmmintrin.h>
 
 namespace
 {
@@ -90,18 +99,111 @@ namespace
         return std::fclose(f) == 0;
     }
 
-    void TimeRuns(const std::string& dir, const std::vector<std::string>& args, int runs)
+    double Median(std::vector<double> values)
+    {
+        if (values.empty())
+            return 0;
+        std::sort(values.begin(), values.end());
+        return values[values.size() / 2];
+    }
+
+    // The number after `label` in ChartBake's timing report, or -1.
+    double Field(const std::string& report, const std::string& label)
+    {
+        size_t at = report.find(label);
+        return at == std::string::npos ? -1 : std::atof(report.c_str() + at + label.size());
+    }
+
+    void TimeRuns(const std::string& dir, const std::vector<std::string>& args, int runs, double inputBytes, double meshBytes)
     {
         const std::string chartBake = std::string(CHARTBAKE_BIN_DIR) + "/ChartBake";
         std::vector<std::string> argv = {chartBake};
         argv.insert(argv.end(), args.begin(), args.end());
+        std::vector<double> readRates, memoryRatios;
         for (int run = 0; run < runs; ++run)
         {
             auto start = std::chrono::steady_clock::now();
             Testing::ChildResult r = Testing::RunProgram(argv, dir, {"CHARTBAKE_TIMINGS=1"});
             double ms = std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - start).count();
             std::printf("  run %d: %8.1f ms total, exit %d\n    %s", run + 1, ms, r.exitStatus, r.err.c_str());
+            size_t memoryLine = r.err.find("peak memory");
+            double readMs = Field(r.err, ", read ");
+            double readKB = memoryLine == std::string::npos ? -1 : Field(r.err.substr(memoryLine), ", read ");
+            if (readMs > 0)
+                readRates.push_back(inputBytes / 1e6 / (readMs / 1e3));
+            if (readKB > 0)
+                memoryRatios.push_back(readKB * 1024.0 / meshBytes);
         }
+        std::printf("  median read: %.0f MB/s; median peak memory after reading / mesh data (%.1f MB): %.2f\n",
+                    Median(readRates), meshBytes / 1e6, Median(memoryRatios));
+    }
+
+    struct ReadMesh
+    {
+        std::vector<float> positions, cornerUVs;
+        std::vector<uint32_t> tri;
+    };
+
+    // The reading that LoadFromObj stands for: fgets into 1,024 bytes, sscanf with the line formats.
+    bool ReadWithScanf(const std::string& path, ReadMesh* mesh)
+    {
+        FILE* f = std::fopen(path.c_str(), "rt");
+        if (!f)
+            return false;
+        std::vector<float> uvs;
+        std::vector<uint32_t> cornerUV;
+        char line[1024];
+        while (std::fgets(line, sizeof line, f))
+        {
+            float a = 0, b = 0, c = 0;
+            uint32_t v[3], t[3];
+            if (line[0] == 'v' && line[1] == ' ')
+            {
+                std::sscanf(line, "v %f %f %f", &a, &b, &c);
+                mesh->positions.insert(mesh->positions.end(), {a, b, c});
+            }
+            else if (line[0] == 'v' && line[1] == 't' && line[2] == ' ')
+            {
+                std::sscanf(line, "vt %f %f", &a, &b);
+                uvs.insert(uvs.end(), {a, b});
+            }
+            else if (line[0] == 'f' && line[1] == ' ' &&
+                     std::sscanf(line, "f %u/%u/%*u %u/%u/%*u %u/%u/%*u", &v[0], &t[0], &v[1], &t[1], &v[2], &t[2]) == 6)
+                for (int k = 0; k < 3; ++k)
+                {
+                    mesh->tri.push_back(v[k] - 1);
+                    cornerUV.push_back(t[k] - 1);
+                }
+        }
+        std::fclose(f);
+        for (uint32_t k : cornerUV)
+            mesh->cornerUVs.insert(mesh->cornerUVs.end(), {uvs.at(2 * (size_t)k), uvs.at(2 * (size_t)k + 1)});
+        return true;
+    }
+
+    // LoadFromObj against ReadWithScanf, bit for bit, under the driver's rounding toward zero.
+    void CompareWithFormattedInput(const std::string& path)
+    {
+        unsigned saved = _mm_getcsr();
+        _mm_setcsr((saved | 0x6000u) & ~0x8000u);
+        UnwrapParam param;
+        uint32_t vertexCount = 0, triCount = 0;
+        float *vertex = nullptr, *uv = nullptr;
+        uint32_t *tri = nullptr, *srcPoly = nullptr;
+        MeshFileError error = LoadFromObj(path.c_str(), &param, &vertexCount, &triCount, &vertex, &uv, &tri, &srcPoly);
+        ReadMesh ref;
+        bool read = ReadWithScanf(path, &ref);
+        _mm_setcsr(saved);
+        bool same = error.empty() && read && ref.positions.size() == 3ull * vertexCount && ref.tri.size() == 3ull * triCount &&
+                    std::memcmp(ref.positions.data(), vertex, ref.positions.size() * 4) == 0 &&
+                    std::memcmp(ref.tri.data(), tri, ref.tri.size() * 4) == 0 &&
+                    std::memcmp(ref.cornerUVs.data(), uv, ref.cornerUVs.size() * 4) == 0;
+        std::printf("LoadFromObj vs fgets+sscanf: %s (%zu position floats, %zu corner UV floats, %zu indices)%s%s\n",
+                    same ? "bit-identical" : "DIFFERENT", ref.positions.size(), ref.cornerUVs.size(), ref.tri.size(),
+                    error.empty() ? "" : ": ", error.c_str());
+        std::free(vertex);
+        std::free(uv);
+        std::free(tri);
     }
 }
 
@@ -133,10 +235,14 @@ int main(int argc, char** argv)
         std::fprintf(stderr, "cannot write the mesh files into %s\n", dir.c_str());
         return 1;
     }
-    std::printf("OBJ (%.1f MB in):\n", std::filesystem::file_size(dir + "/mesh.obj") / 1e6);
-    TimeRuns(dir, {"-obj", "mesh.obj", "out.obj"}, runs);
-    std::printf("binary (%.1f MB in):\n", std::filesystem::file_size(dir + "/mesh.bin") / 1e6);
-    TimeRuns(dir, {"mesh.bin", "out.bin"}, runs);
+    CompareWithFormattedInput(dir + "/mesh.obj");
+    const double objBytes = (double)std::filesystem::file_size(dir + "/mesh.obj");
+    const double binBytes = (double)std::filesystem::file_size(dir + "/mesh.bin");
+    const double positionAndTriangleBytes = 12.0 * grid.VertexCount() + 12.0 * grid.TriangleCount();
+    std::printf("OBJ (%.1f MB in):\n", objBytes / 1e6);
+    TimeRuns(dir, {"-obj", "mesh.obj", "out.obj"}, runs, objBytes, positionAndTriangleBytes + 24.0 * grid.TriangleCount());
+    std::printf("binary (%.1f MB in):\n", binBytes / 1e6);
+    TimeRuns(dir, {"mesh.bin", "out.bin"}, runs, binBytes, positionAndTriangleBytes);
     if (keepDir.empty())
         std::filesystem::remove_all(dir);
     return 0;

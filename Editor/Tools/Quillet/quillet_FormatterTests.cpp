@@ -25,6 +25,7 @@ namespace
         const char* format;
         std::vector<uint64_t> slots;
         const char* expected;
+        int length = -1;  // the result when the text is cut at the buffer's end; else its length
     };
 
     const FormatRow kRows[] = {
@@ -88,6 +89,20 @@ namespace
         {"%.2s", {P("abc")}, "ab"},
         {"%c%c", {'O', 'K'}, "OK"},
         {"%3c|", {'x'}, "x|"},
+        // Beyond about 9.2e117 my_modf gives up after 100 rounds and the integer part reads 0.
+        // (The fraction of such a value is beyond 64 bits too: its digits come out as zeros.)
+        {"%.0f", {D(9e117)}, "90000000000000550000000000000000000000000000000", 118},  // cut at 47
+        {"%.0f", {D(9.3e117)}, "0"},
+        {"%f", {D(1e118)}, "0.0000000000000000000"},
+        {"%.2f|%d", {D(-1e300), 7}, "-0.0000000000000000000|7"},
+        // Windows spellings it does not know: "I64" is no length (the "I" ends the conversion and
+        // "64d" is text), "S" and "a" convert nothing; none of them takes an argument.
+        {"%I64d|%d", {5, 6}, "64d|5"},
+        {"%S|%d", {7}, "|7"},
+        {"%a|%d", {7}, "|7"},
+        {"%A|%d", {7}, "|7"},
+        // "l" does not widen "s": the argument is read as 8-bit text, so UTF-16 stops after one letter.
+        {"%ls|%5ls", {P("abc"), P(u"xy")}, "abc|    x"},
         // Everything else.
         {"%%|%5%", {}, "%|%"},
         {"a%wXb", {}, "ab"},
@@ -137,7 +152,8 @@ UNIT_TEST_SUITE(QuilletFormatter)
         for (const FormatRow& row : kRows)
         {
             Formatted formatted = Vsnprintf(row.format, row.slots);
-            Formatted expected = {static_cast<int>(strlen(row.expected)), row.expected, true};
+            int length = row.length >= 0 ? row.length : static_cast<int>(strlen(row.expected));
+            Formatted expected = {length, row.expected, true};
             CHECK_EQUAL(Describe(row.format, expected), Describe(row.format, formatted));
         }
     }
@@ -177,6 +193,12 @@ UNIT_TEST_SUITE(QuilletFormatter)
         CHECK_EQUAL(3, count32);
         CHECK_EQUAL(0xFFFFFFFFFFFF0005ull, count16);  // only the low 16 bits are written
         CHECK_EQUAL(6, count64);
+
+        // "z" and "j" store 64 bits as well.
+        int64_t countZ = -1, countJ = -1;
+        CHECK_EQUAL(4, Vsnprintf("ab%znc%jnd", {P(&countZ), P(&countJ)}).result);
+        CHECK_EQUAL(2, countZ);
+        CHECK_EQUAL(3, countJ);
     }
 
     TEST(SprintfS_ReadsArgumentsFromRegistersAndTheCallersStack)

@@ -161,22 +161,34 @@ UNIT_TEST_SUITE(QuilletImportsMemory)
         munmap(PageAt(base, 1), kPage);
     }
 
-    // A second mapping at an address that still has a record leaves the old length in place: the
-    // release then unmaps the old, longer length. (The first mapping is removed behind the
-    // record's back so that mmap hands the same address out again.)
-    TEST(VirtualAlloc_AtARecordedAddress_KeepsTheRecordedLength)
+    TEST(VirtualAlloc_AtAnAddressAlreadyRecorded_KeepsTheFirstLength)
     {
         VirtualMemory vm;
-        char* base = static_cast<char*>(vm.alloc(nullptr, 2 * kPage, kMemReserve, kPageReadWrite));
-        CHECK(base != MAP_FAILED);
-        munmap(base, 2 * kPage);
+        // Three pages, unmapped behind the record's back, then one page mapped again at the same
+        // base: the record still says three pages, so the release unmaps three.
+        char* base = static_cast<char*>(vm.alloc(nullptr, 3 * kPage, kMemReserve, kPageReadWrite));
+        munmap(base, 3 * kPage);
         char* again = static_cast<char*>(vm.alloc(base, kPage, kMemReserve, kPageReadWrite));
-        void* second = mmap(PageAt(base, 1), kPage, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_FIXED_NOREPLACE, -1, 0);
-        CHECK(again == base && second == PageAt(base, 1));
-        if (again != base || second != PageAt(base, 1))
-            return;
-        CHECK_EQUAL(1, vm.free(base, 0, kMemRelease));
+        CHECK(again == base);
+        CHECK(IsMapped(again));  // a reservation at an address maps (the address is a free hint)
+        void* rest = mmap(PageAt(base, 1), 2 * kPage, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_FIXED_NOREPLACE, -1, 0);
+        CHECK(rest == PageAt(base, 1));
+        CHECK_EQUAL(1, vm.free(again, 0, kMemRelease));
         CHECK(!IsMapped(PageAt(base, 0)));
-        CHECK(!IsMapped(PageAt(base, 1)));  // two pages: the first record's length
+        CHECK(!IsMapped(PageAt(base, 2)));
+        munmap(base, 3 * kPage);
+    }
+
+    TEST(VirtualAlloc_MapsExecutableMemory_AndAZeroSizeFreeReleasesTheRecordedLength)
+    {
+        VirtualMemory vm;
+        // Whatever protection is asked for, the memory runs code: a lone "ret".
+        unsigned char* code = static_cast<unsigned char*>(vm.alloc(nullptr, 2 * kPage, kMemCommit, kPageReadWrite));
+        code[0] = 0xC3;
+        reinterpret_cast<void (*)()>(code)();
+        // Size 0 with a type other than release still takes the recorded length.
+        CHECK_EQUAL(1, vm.free(code, 0, kMemDecommit));
+        CHECK(!IsMapped(PageAt(code, 0)));
+        CHECK(!IsMapped(PageAt(code, 1)));
     }
 }

@@ -125,6 +125,45 @@ namespace
         return text;
     }
 
+    // The suite "Tessary" in registration order: each test's registration line and, per export it
+    // checks, the check line.
+    struct SelfTestCheck
+    {
+        const char* exportName;
+        int line;
+    };
+    struct SelfTest
+    {
+        const char* name;
+        int line;
+        std::vector<SelfTestCheck> checks;
+    };
+    const SelfTest kSelfTests[] = {
+        {"NonManifoldFixer", 277, {{"Tessary_TestNonManifoldFixer", 279}}},
+        {"DegenerateRemoval", 281, {{"Tessary_TestDegenerateRemoval", 283}}},
+        {"SplitConnected", 285, {{"Tessary_TestSplitConnected", 287}}},
+        {"TriMapBasic", 289, {{"Tessary_TestTriMapBasic", 291}}},
+        {"TriMapVertexIndex", 294, {{"Tessary_TestTriMapVertexIndex", 296}}},
+        {"CollapseEdgeBasic", 299, {{"Tessary_TestCollapseEdgeBasic", 301}}},
+        {"MathBasic", 303, {{"Tessary_TestMathBasic", 305}, {"Tessary_TestTrigonometry", 306}, {"Tessary_TestLog", 307},
+                            {"Tessary_TestMatrix4Invert", 308}, {"Tessary_TestSparseMatrix", 309}}},
+        {"PriorityQueue", 311, {{"Tessary_TestPriorityQueue", 313}}},
+        {"Array", 315, {{"Tessary_TestArray", 317}}},
+        {"BlobArray", 319, {{"Tessary_TestBlobArray", 321}}},
+        {"HashTab", 323, {{"Tessary_TestHashTab", 325}}},
+        {"InternalCollapseEdge", 327, {{"Tessary_TestProgressiveMeshInternalCollapseEdge", 329}}},
+        {"SimplePatchGenerate", 331, {{"Tessary_TestSlidingWindowSimplePatchGenerate", 333}}},
+        {"UnwrapWithDegenerateTriangles", 335, {{"Unwrap_TestUnwrapWithDegenerateTriangles", 337}}},
+        {"UnwrapDontSplitRects", 339, {{"Unwrap_TestUnwrapDontSplitRects", 341}}},
+    };
+    const std::string kCLToolPath = "Editor/Tools/Unwrap/source/CLTool/CLTool.cpp";
+
+    // A test name as the console reporter lines it up.
+    std::string Padded(const std::string& name)
+    {
+        return name + std::string(name.size() < 33 ? 33 - name.size() : 1, ' ');
+    }
+
     const std::string kUsage = "usage:\nChartBake [-obj] <input_file> <output_file>\n";
 }
 
@@ -462,6 +501,43 @@ INTEGRATION_TEST_SUITE(ChartBake)
         CHECK(Contains(r.out, "CLTool.cpp:305)\n"));
         CHECK(Contains(r.out, "CLTool.cpp:309)\n"));
         CHECK(!Contains(r.out, "CLTool.cpp:306)"));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, NativeTests_SuiteOrderAndRegistrationLines)
+    {
+        // Every export crashes: each test fails once, at its registration line, in list order.
+        std::string behaviour = kBehaviour;
+        for (const SelfTest& test : kSelfTests)
+            for (const SelfTestCheck& check : test.checks)
+                behaviour += std::string("crash:") + check.exportName + ",";
+        Testing::ChildResult r = Run({"-runNativeTests"}, {behaviour});
+        CHECK_EQUAL(15, r.exitStatus);
+        std::string expected, failedList;
+        for (const SelfTest& test : kSelfTests)
+        {
+            expected += "[Tessary]  " + Padded(test.name) + "FAIL!!!!\n\tCHECK FAILURE: Unhandled exception: Crash! (" + kCLToolPath +
+                        ":" + std::to_string(test.line) + ")\n";
+            failedList += std::string("\tFAILED: ") + test.name + " [Tessary]\n";
+        }
+        CHECK_EQUAL(expected, r.out.substr(0, r.out.find("Ran ")));
+        CHECK(Contains(r.out, "Ran 15 tests with 15 failures in "));
+        CHECK(Contains(r.out, failedList));
+    }
+
+    TEST_FIXTURE(ChartBakeFixture, NativeTests_EachExportIsCheckedAtItsOwnLine)
+    {
+        for (const SelfTest& test : kSelfTests)
+            for (const SelfTestCheck& check : test.checks)
+            {
+                Testing::ChildResult r = Run({"-runNativeTests"}, {std::string(kBehaviour) + "fail:" + check.exportName});
+                CHECK_EQUAL(1, r.exitStatus);
+                const std::string expected = "[Tessary]  " + Padded(test.name) +
+                                             "FAIL!!!!\n\tCHECK FAILURE: Expected values to be the same, but they were not\n"
+                                             "\tExpected: 1\n\t  Actual: 0\n (" + kCLToolPath + ":" + std::to_string(check.line) + ")\n";
+                CHECK_EQUAL(check.exportName + (": " + expected),
+                            check.exportName + (": " + (Contains(r.out, expected) ? expected : r.out)));
+                CHECK(Contains(r.out, "Ran 15 tests with 1 failures in "));
+            }
     }
 
     TEST_FIXTURE(ChartBakeFixture, NativeTests_MissingLibraries_FailTheTestsThatNeedThem)

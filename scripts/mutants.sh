@@ -1,0 +1,161 @@
+#!/usr/bin/env bash
+# Deliberate faults, one at a time, to show that the unit tests notice each of them.
+#
+#   scripts/mutants.sh [--dry-run] [pattern]
+#
+# Every line of scripts/mutants/*.txt is one fault:
+#
+#   <file><TAB><sed substitution><TAB><what it breaks>
+#
+# (blank lines and lines starting with # are skipped; <file> is relative to the repository root).
+# With a pattern, only the faults whose line contains it (grep -E) are tried. --dry-run only
+# applies each substitution to a copy of its file and shows the change, without building.
+#
+# The tree (tracked and untracked files, as they are now) is copied into a scratch directory,
+# $MUTANTS_DIR or build-mutants/ beside the sources, and built there once in its own build
+# directory (kept, so that a later run only rebuilds what changed). Then, for each fault: apply
+# the substitution to the scratch copy, rebuild incrementally, run UnitTests, put the file back.
+# A fault is caught when UnitTests fails (a failed test, a crash or the time limit). The run
+# reports every fault the tests miss, every substitution that changes nothing and every fault
+# that does not compile, and exits 1 if there is any of them.
+set -euo pipefail
+root=$(cd "$(dirname "$0")/.." && pwd)
+scratch=${MUTANTS_DIR:-$root/build-mutants}
+src=$scratch/src
+build=$scratch/build
+dry_run=false
+if [ "${1:-}" = "--dry-run" ]; then
+  dry_run=true
+  shift
+fi
+pattern=${1:-}
+test_timeout=${MUTANTS_TEST_TIMEOUT:-600}
+log=$scratch/last-fault.log
+
+# Copies the tree into $src: only files whose contents differ, so that timestamps of unchanged
+# files stay and the build stays incremental; files that are gone from the tree go from $src too.
+sync_tree() {
+  mkdir -p "$src"
+  local list
+  list=$(mktemp -p "$scratch" files.XXXXXX)
+  (cd "$root" && git ls-files -co --exclude-standard) | sort >"$list"
+  while IFS= read -r f; do
+    [ -f "$root/$f" ] || continue
+    if ! cmp -s "$root/$f" "$src/$f"; then
+      mkdir -p "$(dirname "$src/$f")"
+      cp "$root/$f" "$src/$f"
+    fi
+  done <"$list"
+  (cd "$src" && find . -type f | sed 's|^\./||' | sort) | comm -23 - "$list" | while IFS= read -r f; do
+    rm -f "$src/$f"
+  done
+  rm -f "$list"
+}
+
+build_scratch() {
+  nice cmake --build "$build" -j2 --target UnitTests >"$log" 2>&1
+}
+
+run_tests() {
+  (cd "$build" && timeout "$test_timeout" ./bin/UnitTests >>"$log" 2>&1)
+}
+
+# Applies every selected substitution to a copy of its file and shows the change.
+dry_run_all() {
+  local list line number file substitution what copy status=0
+  copy=$(mktemp)
+  trap 'rm -f "$copy"' RETURN
+  for list in "$root"/scripts/mutants/*.txt; do
+    number=0
+    while IFS= read -r line || [ -n "$line" ]; do
+      number=$((number + 1))
+      [[ -z "${line//[[:space:]]/}" || "$line" == \#* ]] && continue
+      [ -n "$pattern" ] && ! grep -qE -- "$pattern" <<<"$line" && continue
+      IFS=$'\t' read -r file substitution what <<<"$line"
+      echo "== $(basename "$list"):$number  $what"
+      if [ -z "$what" ] || [ ! -f "$root/$file" ] || ! sed -e "$substitution" "$root/$file" >"$copy" ||
+        cmp -s "$root/$file" "$copy"; then
+        echo "   NOT APPLIED"
+        status=1
+      else
+        diff "$root/$file" "$copy" | sed 's/^/   /' || true
+      fi
+    done <"$list"
+  done
+  return $status
+}
+
+if $dry_run; then
+  dry_run_all
+  exit
+fi
+
+mkdir -p "$scratch"
+echo "mutants: scratch copy in $scratch"
+sync_tree
+if [ ! -f "$build/build.ninja" ]; then
+  cmake -S "$src" -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo -DCHARTBAKE_WERROR=OFF >/dev/null
+fi
+echo "mutants: building the unchanged copy"
+if ! build_scratch; then
+  cat "$log"
+  echo "mutants: the unchanged tree does not build" >&2
+  exit 2
+fi
+echo "mutants: running the unit tests on the unchanged copy"
+if ! run_tests; then
+  tail -30 "$log"
+  echo "mutants: the unit tests fail without any fault; fix that first" >&2
+  exit 2
+fi
+
+total=0 caught=0
+problems=()
+shopt -s nullglob
+for list in "$root"/scripts/mutants/*.txt; do
+  number=0
+  while IFS= read -r line || [ -n "$line" ]; do
+    number=$((number + 1))
+    [[ -z "${line//[[:space:]]/}" || "$line" == \#* ]] && continue
+    [ -n "$pattern" ] && ! grep -qE -- "$pattern" <<<"$line" && continue
+    IFS=$'\t' read -r file substitution what <<<"$line"
+    where="$(basename "$list"):$number"
+    total=$((total + 1))
+    if [ -z "$file" ] || [ -z "$substitution" ] || [ -z "$what" ]; then
+      problems+=("MALFORMED  $where: expected file<TAB>substitution<TAB>description")
+      echo "  malformed    $where"
+      continue
+    fi
+    if [ ! -f "$src/$file" ]; then
+      problems+=("NO FILE    $where: $file")
+      echo "  no file      $where  $file"
+      continue
+    fi
+    if ! sed -i -e "$substitution" "$src/$file" 2>"$log" || cmp -s "$root/$file" "$src/$file"; then
+      cp "$root/$file" "$src/$file"
+      problems+=("NOT APPLIED $where: $file: $substitution")
+      echo "  not applied  $where  $what"
+      continue
+    fi
+    if ! build_scratch; then
+      result="no build"
+      problems+=("NO BUILD   $where: $what (see the compiler output with: scripts/mutants.sh '$substitution')")
+    elif run_tests; then
+      result="MISSED"
+      problems+=("MISSED     $where: $what ($file: $substitution)")
+    else
+      result="caught"
+      caught=$((caught + 1))
+    fi
+    printf '  %-12s %s  %s\n' "$result" "$where" "$what"
+    cp "$root/$file" "$src/$file"
+  done <"$list"
+done
+
+# Leave the scratch build matching the tree again.
+build_scratch || true
+echo "mutants: $caught of $total faults caught"
+if [ ${#problems[@]} -gt 0 ]; then
+  printf '%s\n' "${problems[@]}"
+  exit 1
+fi
