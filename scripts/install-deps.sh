@@ -3,7 +3,12 @@
 # Safe to run repeatedly: it only calls apt-get when something is missing.
 set -euo pipefail
 
-packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm)
+packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm
+          # chartbake-mesh: mesh import (OBJ, PLY, STL, FBX), glTF round trip, layout pictures
+          libassimp-dev libtinygltf-dev nlohmann-json3-dev libpng-dev)
+# The glTF validator the tests run comes from npm (scripts/install-validator.sh); npm itself from
+# Debian when the machine has none.
+command -v npm >/dev/null 2>&1 || packages+=(nodejs npm)
 
 missing=()
 for p in "${packages[@]}"; do
