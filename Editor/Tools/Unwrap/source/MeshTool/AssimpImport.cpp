@@ -1,5 +1,7 @@
 #include "Editor/Tools/Unwrap/source/MeshTool/AssimpImport.h"
 
+#include "Editor/Tools/Unwrap/source/MeshTool/PolygonTriangulation.h"
+
 #include <assimp/Importer.hpp>
 #include <assimp/material.h>
 #include <assimp/postprocess.h>
@@ -48,9 +50,23 @@ namespace
             if (mesh.mTextureCoords[0])
                 primitive.uvs.insert(primitive.uvs.end(), {mesh.mTextureCoords[0][v].x, mesh.mTextureCoords[0][v].y});
         }
+        // Polygons are cut here rather than by assimp, whose triangulation covers the notch of
+        // concave polygons; each triangle remembers its polygon for the unwrapper.
         for (unsigned f = 0; f < mesh.mNumFaces; ++f)
-            if (mesh.mFaces[f].mNumIndices == 3)
-                primitive.indices.insert(primitive.indices.end(), mesh.mFaces[f].mIndices, mesh.mFaces[f].mIndices + 3);
+        {
+            const aiFace& face = mesh.mFaces[f];
+            if (face.mNumIndices < 3)
+                continue;
+            std::vector<float> corners;
+            for (unsigned c = 0; c < face.mNumIndices; ++c)
+            {
+                const aiVector3D& p = mesh.mVertices[face.mIndices[c]];
+                corners.insert(corners.end(), {p.x, p.y, p.z});
+            }
+            for (uint32_t corner : TriangulatePolygon(corners))
+                primitive.indices.push_back(face.mIndices[corner]);
+            primitive.sourcePolygon.resize(primitive.indices.size() / 3, f);
+        }
         return primitive;
     }
 
@@ -62,7 +78,7 @@ namespace
         for (unsigned i = 0; i < node.mNumMeshes; ++i)
         {
             const aiMesh& mesh = *source.mMeshes[node.mMeshes[i]];
-            if (!(mesh.mPrimitiveTypes & aiPrimitiveType_TRIANGLE))
+            if (!(mesh.mPrimitiveTypes & (aiPrimitiveType_TRIANGLE | aiPrimitiveType_POLYGON)))
                 continue;
             ScenePrimitive primitive = ConvertMesh(mesh, world, node.mName.C_Str());
             primitive.atlasGroup = nodeGroup;
@@ -77,10 +93,7 @@ namespace
 std::string ImportWithAssimp(const std::string& path, MeshScene* scene)
 {
     Assimp::Importer importer;
-    // Keep points and lines out of the triangle meshes; the rest as the file has it.
-    importer.SetPropertyInteger(AI_CONFIG_PP_SBP_REMOVE, aiPrimitiveType_POINT | aiPrimitiveType_LINE);
-    const aiScene* source = importer.ReadFile(path, aiProcess_Triangulate | aiProcess_JoinIdenticalVertices |
-                                                        aiProcess_SortByPType | aiProcess_ValidateDataStructure);
+    const aiScene* source = importer.ReadFile(path, aiProcess_JoinIdenticalVertices | aiProcess_ValidateDataStructure);
     if (!source)
         return importer.GetErrorString();
     if (!source->mRootNode)

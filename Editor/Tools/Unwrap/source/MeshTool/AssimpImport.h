@@ -1,5 +1,5 @@
 #pragma once
-// Import of OBJ, PLY, STL and FBX through assimp: polygons triangulated (concave ones too),
+// Import of OBJ, PLY, STL and FBX through assimp: polygons triangulated here (concave ones too, see PolygonTriangulation),
 // identical vertices joined so that the unwrapper sees shared edges, every mesh placed in world
 // space by its node. Points and lines are left out.
 

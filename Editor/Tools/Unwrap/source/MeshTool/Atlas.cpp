@@ -25,7 +25,8 @@ namespace
                                AtlasResult* result)
     {
         std::vector<float> vertex;
-        std::vector<uint32_t> tri;
+        std::vector<uint32_t> tri, srcPoly;
+        bool anyPolygons = false;
         for (size_t i : members)
         {
             const ScenePrimitive& primitive = scene.primitives[i];
@@ -33,6 +34,11 @@ namespace
             vertex.insert(vertex.end(), primitive.positions.begin(), primitive.positions.end());
             for (uint32_t index : primitive.indices)
                 tri.push_back(base + index);
+            // Polygon numbers stay apart between primitives; a triangle without one is its own.
+            uint32_t polygonBase = (uint32_t)srcPoly.size();
+            for (uint32_t t = 0; t < primitive.TriangleCount(); ++t)
+                srcPoly.push_back(polygonBase + (t < primitive.sourcePolygon.size() ? primitive.sourcePolygon[t] : t));
+            anyPolygons |= !primitive.sourcePolygon.empty();
         }
         for (float c : vertex)
             if (!std::isfinite(c))
@@ -46,7 +52,7 @@ namespace
         {
             UnwrapFloatingPointScope scope;
             success = CallGenerateSecondaryUVSet(vertex.data(), (uint32_t)(vertex.size() / 3), nullptr, tri.data(),
-                                                 nullptr, triCount, outUV.data(), param, errorBuffer);
+                                                 anyPolygons ? srcPoly.data() : nullptr, triCount, outUV.data(), param, errorBuffer);
         }
         std::string message(errorBuffer, strnlen(errorBuffer, sizeof errorBuffer));
         if (!success)

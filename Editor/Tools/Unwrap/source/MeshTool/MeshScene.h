@@ -17,6 +17,7 @@ struct ScenePrimitive
     std::vector<float> normals;     // 3 a vertex, or empty
     std::vector<float> uvs;         // 2 a vertex (the first UV set), or empty
     std::vector<uint32_t> indices;  // 3 a triangle, each < vertex count
+    std::vector<uint32_t> sourcePolygon;  // per triangle, the polygon face it was cut from, or empty
 
     uint32_t VertexCount() const { return (uint32_t)(positions.size() / 3); }
     uint32_t TriangleCount() const { return (uint32_t)(indices.size() / 3); }
