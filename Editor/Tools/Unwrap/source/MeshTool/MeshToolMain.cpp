@@ -64,8 +64,9 @@ namespace
             return Fail(error);
 
         if (!options.quiet)
-            std::printf("chartbake-mesh: wrote %s: %llu triangles, %u charts, %.1f%% of the atlas used, %.2f s\n",
-                        options.outputPath.c_str(), (unsigned long long)input.scene.TriangleCount(), charts.chartCount,
+            std::printf("chartbake-mesh: wrote %s: %llu triangle%s, %u chart%s, %.1f%% of the atlas used, %.2f s\n",
+                        options.outputPath.c_str(), (unsigned long long)input.scene.TriangleCount(),
+                        input.scene.TriangleCount() == 1 ? "" : "s", charts.chartCount, charts.chartCount == 1 ? "" : "s",
                         charts.utilization * 100, progress.Seconds());
         return 0;
     }
