@@ -13,7 +13,7 @@ namespace
         int size;
         std::vector<uint8_t> rgb;
 
-        explicit Canvas(int n) : size(n), rgb((size_t)n * (size_t)n * 3, 40) {}
+        explicit Canvas(int n) : size(n), rgb((size_t)n * (size_t)n * 3, 72) {}
 
         void Set(int x, int y, const uint8_t* colour)
         {
@@ -142,7 +142,7 @@ std::string DrawLayoutPng(const MeshScene& scene, const std::vector<CornerUVs>& 
             for (int c = 0; c < 3; ++c)
                 ++edgeUses[edgeKey(p, t, c)];
         }
-    const uint8_t outline[3] = {20, 20, 28};
+    const uint8_t outline[3] = {12, 12, 16};
     for (size_t p = 0; p < scene.primitives.size(); ++p)
         for (uint32_t t = 0; t < scene.primitives[p].TriangleCount(); ++t)
             for (int c = 0; c < 3; ++c)

@@ -66,6 +66,12 @@ namespace MeshToolTest
         // The validator's verdict: its last line ("errors N warnings M") and any error lines.
         Testing::ChildResult Validate(const std::string& name) const
         {
+            if (!std::filesystem::exists(kToolsDir + "/node_modules/gltf-validator"))
+            {
+                Testing::ChildResult missing;
+                missing.out = "the glTF validator is not installed: run scripts/install-validator.sh\n";
+                return missing;
+            }
             return Testing::RunProgram({"/usr/bin/env", "node", kSourceDir + "/scripts/validate-gltf.js", PathOf(name)}, dir,
                                        {"NODE_PATH=" + kToolsDir + "/node_modules"});
         }
