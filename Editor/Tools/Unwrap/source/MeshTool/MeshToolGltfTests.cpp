@@ -33,6 +33,30 @@ namespace
             node.mesh = i;
             m.nodes.push_back(node);
         }
+        // A morph target on the left cube pushing out its -x face (vertices 0-3, whose order the
+        // output changes), each corner by its own amount, stored sparsely over zeros.
+        {
+            const uint16_t moved[4] = {0, 1, 2, 3};
+            const float lift[12] = {-0.1f, 0, 0, -0.2f, 0, 0, -0.3f, 0, 0, -0.4f, 0, 0};
+            tinygltf::Accessor target;
+            target.type = TINYGLTF_TYPE_VEC3;
+            target.componentType = TINYGLTF_COMPONENT_TYPE_FLOAT;
+            target.count = 24;
+            target.bufferView = -1;
+            target.minValues = {-0.4f, 0, 0};
+            target.maxValues = {0, 0, 0};
+            target.sparse.isSparse = true;
+            target.sparse.count = 4;
+            target.sparse.indices.bufferView = b.View(moved, sizeof moved);
+            target.sparse.indices.byteOffset = 0;
+            target.sparse.indices.componentType = TINYGLTF_COMPONENT_TYPE_UNSIGNED_SHORT;
+            target.sparse.values.bufferView = b.View(lift, sizeof lift);
+            target.sparse.values.byteOffset = 0;
+            m.accessors.push_back(target);
+            m.meshes[0].primitives[0].targets.push_back({{"POSITION", (int)m.accessors.size() - 1}});
+            m.meshes[0].weights = {0.25};
+        }
+
         tinygltf::Primitive points;
         points.mode = TINYGLTF_MODE_POINTS;
         points.attributes["POSITION"] = b.Vec3({0, 5, 0, 1, 5, 0}, true);

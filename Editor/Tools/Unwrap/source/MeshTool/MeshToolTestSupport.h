@@ -128,6 +128,19 @@ namespace MeshToolTest
             model.accessors.push_back(AppendAccessorData(&model, 0, like, dense, target, bounds));
             return (int)model.accessors.size() - 1;
         }
+        // Raw bytes in a buffer view of their own (for sparse indices and values), 4-byte aligned.
+        int View(const void* data, size_t size)
+        {
+            std::vector<unsigned char>& buffer = model.buffers[0].data;
+            buffer.resize((buffer.size() + 3) / 4 * 4, 0);
+            tinygltf::BufferView view;
+            view.buffer = 0;
+            view.byteOffset = buffer.size();
+            view.byteLength = size;
+            buffer.insert(buffer.end(), static_cast<const unsigned char*>(data), static_cast<const unsigned char*>(data) + size);
+            model.bufferViews.push_back(view);
+            return (int)model.bufferViews.size() - 1;
+        }
         int Vec3(const std::vector<float>& v, bool bounds = false)
         {
             return Add(v.data(), v.size() / 3, TINYGLTF_TYPE_VEC3, TINYGLTF_COMPONENT_TYPE_FLOAT, TINYGLTF_TARGET_ARRAY_BUFFER, bounds);
@@ -229,6 +242,19 @@ namespace MeshToolTest
                         if (before[inTriangles[c]] != after[outTriangles[c]])
                             return where + name + " changed at corner " + std::to_string(c);
                 }
+                if (in.targets.size() != out.targets.size())
+                    return where + "morph targets lost";
+                for (size_t t = 0; t < in.targets.size(); ++t)
+                    for (const auto& [name, accessor] : in.targets[t])
+                    {
+                        std::vector<std::string> before = Elements(input, accessor);
+                        std::vector<std::string> after = Elements(output, out.targets[t].at(name));
+                        if (after.size() != count)
+                            return where + "morph target " + name + " has a count other than POSITION's";
+                        for (size_t c = 0; c < inTriangles.size(); ++c)
+                            if (before[inTriangles[c]] != after[outTriangles[c]])
+                                return where + "morph target " + name + " changed at corner " + std::to_string(c);
+                    }
                 std::vector<float> uv = Floats(output, out.attributes.at(lightmap));
                 if (uv.size() != 2 * count)
                     return where + lightmap + " has a count other than POSITION's";
