@@ -227,6 +227,36 @@ INTEGRATION_TEST_SUITE(ChartBakeMeshGltf)
         }
     }
 
+    TEST_FIXTURE(MeshToolFixture, ExternalBuffer_ReadBesideTheFile_NeverOverwritten)
+    {
+        // One triangle; its buffer in tri.bin: 3 positions, 3 16-bit indices, 2 bytes of padding.
+        const float positions[9] = {0, 0, 0, 1, 0, 0, 0, 1, 0};
+        const uint16_t indices[4] = {0, 1, 2, 0};
+        std::string bin(reinterpret_cast<const char*>(positions), sizeof positions);
+        bin.append(reinterpret_cast<const char*>(indices), sizeof indices);
+        Write("tri.bin", bin);
+        Write("tri.gltf",
+              R"({"asset": {"version": "2.0"}, "scene": 0, "scenes": [{"nodes": [0]}], "nodes": [{"mesh": 0}],
+                  "meshes": [{"primitives": [{"attributes": {"POSITION": 0}, "indices": 1}]}],
+                  "buffers": [{"uri": "tri.bin", "byteLength": 44}],
+                  "bufferViews": [{"buffer": 0, "byteLength": 36, "target": 34962},
+                                  {"buffer": 0, "byteOffset": 36, "byteLength": 6, "target": 34963}],
+                  "accessors": [{"bufferView": 0, "componentType": 5126, "count": 3, "type": "VEC3",
+                                 "min": [0, 0, 0], "max": [1, 1, 0]},
+                                {"bufferView": 1, "componentType": 5123, "count": 3, "type": "SCALAR"}]})");
+        CHECK_EQUAL("errors 0 warnings 0\n", Validate("tri.gltf").out);
+        Testing::ChildResult r = Run({"tri.gltf", "tri_lightmapped.gltf"});
+        CHECK_EQUAL(0, r.exitStatus);
+        CHECK_EQUAL(bin, Read("tri.bin"));
+        CHECK_EQUAL("errors 0 warnings 0\n", Validate("tri_lightmapped.gltf").out);
+
+        std::filesystem::remove(PathOf("tri.bin"));
+        r = Run({"tri.gltf", "again.gltf"});
+        CHECK_EQUAL(1, r.exitStatus);
+        CHECK(Contains(r.err, "chartbake-mesh: cannot read tri.gltf: "));
+        CHECK(!Exists("again.gltf"));
+    }
+
     TEST_FIXTURE(MeshToolFixture, Gltf_ToObj_KeepsNamesMaterialsAndNormals)
     {
         Write("scene.gltf", TwoCubeScene().Bytes(false));

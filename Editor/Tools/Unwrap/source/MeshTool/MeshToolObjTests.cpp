@@ -3,6 +3,10 @@
 #include "Editor/Tools/Unwrap/source/MeshTool/MeshToolTestSupport.h"
 #include "Runtime/Testing/Testing.h"
 
+#include <assimp/Exporter.hpp>
+#include <assimp/Importer.hpp>
+#include <assimp/scene.h>
+
 #include <array>
 #include <cstdio>
 
@@ -178,6 +182,25 @@ INTEGRATION_TEST_SUITE(ChartBakeMeshObj)
             CHECK(Contains(r.out, "4 triangles"));
             CHECK_EQUAL("errors 0 warnings 0\n", Validate(input + ".glb").out);
         }
+    }
+
+    TEST_FIXTURE(MeshToolFixture, Fbx_UnwrapsIntoValidGlb)
+    {
+        // The FBX file is the cube converted by assimp's own exporter (its text form: the
+        // binary form assimp 5.2 writes does not read back).
+        Write("cube.obj", CubeObj(FullCorner));
+        Assimp::Importer importer;
+        const aiScene* scene = importer.ReadFile(PathOf("cube.obj"), 0);
+        CHECK(scene != nullptr);
+        if (!scene)
+            return;
+        Assimp::Exporter exporter;
+        CHECK_EQUAL(AI_SUCCESS, exporter.Export(scene, "fbxa", PathOf("cube.fbx")));
+        Testing::ChildResult r = Run({"cube.fbx", "cube.glb"});
+        CHECK_EQUAL("", r.err);
+        CHECK_EQUAL(0, r.exitStatus);
+        CHECK(Contains(r.out, "12 triangles"));
+        CHECK_EQUAL("errors 0 warnings 0\n", Validate("cube.glb").out);
     }
 
     TEST_FIXTURE(MeshToolFixture, Layout_PictureHasTheChosenResolution)
