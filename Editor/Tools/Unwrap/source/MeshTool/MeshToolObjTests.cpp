@@ -184,6 +184,19 @@ INTEGRATION_TEST_SUITE(ChartBakeMeshObj)
         }
     }
 
+    TEST_FIXTURE(MeshToolFixture, Weld_JoinsTrianglesThatOnlyShareCornerPositions)
+    {
+        // A flat square of two triangles that share no vertex: their corners at the diagonal
+        // differ in normal, so the file keeps them apart. Apart they are two charts (nothing
+        // connects them); welded by position, they are one flat piece.
+        Write("split.obj", "v 0 0 0\nv 1 0 0\nv 0 1 0\nv 1 1 0\nvn 0 0 1\nvn 0 0.1 0.995\n"
+                           "f 1//1 2//1 3//1\nf 2//2 4//2 3//2\n");
+        Testing::ChildResult apart = Run({"split.obj", "apart.glb"});
+        Testing::ChildResult welded = Run({"--weld", "split.obj", "welded.glb"});
+        CHECK(Contains(apart.out, "2 triangles, 2 charts"));
+        CHECK(Contains(welded.out, "2 triangles, 1 chart,"));
+    }
+
     TEST_FIXTURE(MeshToolFixture, Fbx_UnwrapsIntoValidGlb)
     {
         // The FBX file is the cube converted by assimp's own exporter (its text form: the

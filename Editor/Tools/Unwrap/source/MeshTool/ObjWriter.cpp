@@ -75,8 +75,9 @@ ObjFiles WriteObj(const MeshScene& scene, const std::vector<CornerUVs>& uvs, con
     {
         const ScenePrimitive& primitive = scene.primitives[p];
         std::string name = ObjName(primitive.name, "object" + std::to_string(p));
+        // Readers take either line as the grouping; both carry the name.
         if (p == 0 || name != lastName)
-            obj += "o " + name + "\n";
+            obj += "o " + name + "\ng " + name + "\n";
         lastName = name;
         VertexSplit split = SplitVerticesByUV(primitive.indices, uvs[p]);
         for (size_t i = 0; i < primitive.positions.size(); i += 3)
