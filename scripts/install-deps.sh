@@ -3,8 +3,14 @@
 # Safe to run repeatedly: it only calls apt-get when something is missing.
 set -euo pipefail
 
-# libclang-rt-14-dev: the libFuzzer and sanitizer runtimes for scripts/fuzz.sh.
-packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm libclang-rt-14-dev)
+packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm
+          # the libFuzzer and sanitizer runtimes for scripts/fuzz.sh
+          libclang-rt-14-dev
+          # chartbake-mesh: mesh import (OBJ, PLY, STL, FBX), glTF round trip, layout pictures
+          libassimp-dev libtinygltf-dev nlohmann-json3-dev libpng-dev)
+# The glTF validator the tests run comes from npm (scripts/install-validator.sh); npm itself from
+# Debian when the machine has none.
+command -v npm >/dev/null 2>&1 || packages+=(nodejs npm)
 
 missing=()
 for p in "${packages[@]}"; do

@@ -4,5 +4,6 @@ set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 "$root/scripts/install-deps.sh"
 "$root/scripts/build.sh"
+"$root/scripts/install-validator.sh"
 cd "${BUILD_DIR:-$root/build}"
 ctest --output-on-failure

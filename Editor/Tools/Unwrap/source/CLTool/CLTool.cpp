@@ -7,6 +7,7 @@
 #include "Editor/Tools/Unwrap/source/CLTool/LibraryExports.h"
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
 #include "Editor/Tools/Unwrap/source/CLTool/PhaseTimings.h"
+#include "Editor/Tools/Unwrap/source/CLTool/UnwrapLibraries.h"
 #include "Runtime/Logging/LogAssert.h"
 #include "Runtime/Testing/Testing.h"
 
@@ -14,25 +15,14 @@
 #include <cstdlib>
 #include <cstring>
 #include <sstream>
-#include <xmmintrin.h>
 
 namespace
 {
-    const uint32_t kUnwrapErrorBufferSize = 1024;
-
     int PrintUsage()
     {
         std::puts("usage:");
         std::puts("ChartBake [-obj] <input_file> <output_file>");
         return 1;
-    }
-
-    // Round toward zero (rounding field, bits 13-14, to 11), then flush-to-zero (bit 15) off;
-    // every other bit stays. Never restored: it holds for the file I/O and all library code.
-    void SetUnwrapFloatingPointState()
-    {
-        _mm_setcsr(_mm_getcsr() | 0x6000u);
-        _mm_setcsr(_mm_getcsr() & ~0x8000u);
     }
 
     int Fail(const std::string& message)
@@ -66,9 +56,8 @@ namespace
         if (!outUV)
             return Fail("out of memory for the UVs of " + std::to_string(triCount) + " triangles");
 
-        PESetupFS();
-        bool success = GenerateSecondaryUVSetImpl(vertex, (int32_t)vertexCount, triUV, tri, srcPoly, (int32_t)triCount,
-                                                  outUV, unwrapParam, unwrapErrorBuffer, kUnwrapErrorBufferSize);
+        bool success = CallGenerateSecondaryUVSet(vertex, vertexCount, triUV, tri, srcPoly, triCount, outUV, unwrapParam,
+                                                  unwrapErrorBuffer);
         GetPhaseTimings().Mark(PhaseTimings::kUnwrap);
         if (unwrapErrorBuffer[0] != 0)
         {
@@ -102,13 +91,9 @@ int main(int argc, char** argv)
 #undef SERVICE_ROW
 #undef TEST_ROW
 
-    _TessaryDll = LoadLibraryNamed("Tessary.dll", nullptr, 0, &g_TessaryLoad);
-    BindServiceExports();
     // The test rows are copied before the test exports are bound, so they stay empty.
-    static const bool knownImportsFilled = (FillKnownImports(_KnownImports), true);
-    (void)knownImportsFilled;
-    _UnwrapDll = LoadLibraryNamed("Unwrap.dll", _KnownImports, kLibraryImportRows, &g_UnwrapLoad);
-    GenerateSecondaryUVSetImpl = reinterpret_cast<_GenerateSecondaryUVSetImpl>(PEGetProcAddress(_UnwrapDll, "GenerateSecondaryUVSet"));
+    LoadUnwrapLibraries(_KnownImports);
+    // Never restored: it holds for the file I/O and all library code.
     SetUnwrapFloatingPointState();
     GetPhaseTimings().Mark(PhaseTimings::kLoadLibraries);
 
