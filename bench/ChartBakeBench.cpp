@@ -11,6 +11,7 @@
 // Before timing, the OBJ file is read in-process by LoadFromObj and line by line with fgets and
 // sscanf, both under the driver's rounding toward zero, and every number is compared bit for bit.
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
+#include "Editor/Tools/Unwrap/source/CLTool/ObjScanfReference.h"
 #include "Runtime/Testing/ChildProcess.h"
 
 #include <algorithm>
@@ -138,50 +139,7 @@ namespace
                     Median(readRates), meshBytes / 1e6, Median(memoryRatios));
     }
 
-    struct ReadMesh
-    {
-        std::vector<float> positions, cornerUVs;
-        std::vector<uint32_t> tri;
-    };
-
-    // The reading that LoadFromObj stands for: fgets into 1,024 bytes, sscanf with the line formats.
-    bool ReadWithScanf(const std::string& path, ReadMesh* mesh)
-    {
-        FILE* f = std::fopen(path.c_str(), "rt");
-        if (!f)
-            return false;
-        std::vector<float> uvs;
-        std::vector<uint32_t> cornerUV;
-        char line[1024];
-        while (std::fgets(line, sizeof line, f))
-        {
-            float a = 0, b = 0, c = 0;
-            uint32_t v[3], t[3];
-            if (line[0] == 'v' && line[1] == ' ')
-            {
-                std::sscanf(line, "v %f %f %f", &a, &b, &c);
-                mesh->positions.insert(mesh->positions.end(), {a, b, c});
-            }
-            else if (line[0] == 'v' && line[1] == 't' && line[2] == ' ')
-            {
-                std::sscanf(line, "vt %f %f", &a, &b);
-                uvs.insert(uvs.end(), {a, b});
-            }
-            else if (line[0] == 'f' && line[1] == ' ' &&
-                     std::sscanf(line, "f %u/%u/%*u %u/%u/%*u %u/%u/%*u", &v[0], &t[0], &v[1], &t[1], &v[2], &t[2]) == 6)
-                for (int k = 0; k < 3; ++k)
-                {
-                    mesh->tri.push_back(v[k] - 1);
-                    cornerUV.push_back(t[k] - 1);
-                }
-        }
-        std::fclose(f);
-        for (uint32_t k : cornerUV)
-            mesh->cornerUVs.insert(mesh->cornerUVs.end(), {uvs.at(2 * (size_t)k), uvs.at(2 * (size_t)k + 1)});
-        return true;
-    }
-
-    // LoadFromObj against ReadWithScanf, bit for bit, under the driver's rounding toward zero.
+    // LoadFromObj against ReadObjWithScanf, bit for bit, under the driver's rounding toward zero.
     void CompareWithFormattedInput(const std::string& path)
     {
         unsigned saved = _mm_getcsr();
@@ -191,8 +149,8 @@ namespace
         float *vertex = nullptr, *uv = nullptr;
         uint32_t *tri = nullptr, *srcPoly = nullptr;
         MeshFileError error = LoadFromObj(path.c_str(), &param, &vertexCount, &triCount, &vertex, &uv, &tri, &srcPoly);
-        ReadMesh ref;
-        bool read = ReadWithScanf(path, &ref);
+        ObjScanfReference ref;
+        bool read = ReadObjWithScanf(path, &ref);
         _mm_setcsr(saved);
         bool same = error.empty() && read && ref.positions.size() == 3ull * vertexCount && ref.tri.size() == 3ull * triCount &&
                     std::memcmp(ref.positions.data(), vertex, ref.positions.size() * 4) == 0 &&

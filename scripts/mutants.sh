@@ -8,7 +8,8 @@
 #   <file><TAB><sed substitution><TAB><what it breaks>
 #
 # (blank lines and lines starting with # are skipped; <file> is relative to the repository root).
-# With a pattern, only the faults whose line contains it (grep -E) are tried. --dry-run only
+# With a pattern, only the faults whose line, or list name and line number ("mesh.txt:4"), match
+# it (grep -E) are tried. --dry-run only
 # applies each substitution to a copy of its file and shows the change, without building.
 #
 # The tree (tracked and untracked files, as they are now) is copied into a scratch directory,
@@ -60,34 +61,42 @@ run_tests() {
   (cd "$build" && timeout "$test_timeout" ./bin/UnitTests >>"$log" 2>&1)
 }
 
-# Applies every selected substitution to a copy of its file and shows the change.
-dry_run_all() {
-  local list line number file substitution what copy status=0
-  copy=$(mktemp)
-  trap 'rm -f "$copy"' RETURN
+# Calls the function named $1 with (where, file, substitution, what) for every selected fault.
+# The lists are read on descriptor 3, so that nothing the handler runs can read them.
+each_fault() {
+  local handler=$1 list line number file substitution what
+  shopt -s nullglob
   for list in "$root"/scripts/mutants/*.txt; do
     number=0
-    while IFS= read -r line || [ -n "$line" ]; do
+    while IFS= read -r line <&3 || [ -n "$line" ]; do
       number=$((number + 1))
       [[ -z "${line//[[:space:]]/}" || "$line" == \#* ]] && continue
-      [ -n "$pattern" ] && ! grep -qE -- "$pattern" <<<"$line" && continue
+      [ -n "$pattern" ] && ! grep -qE -- "$pattern" <<<"$(basename "$list"):$number $line" && continue
       IFS=$'\t' read -r file substitution what <<<"$line"
-      echo "== $(basename "$list"):$number  $what"
-      if [ -z "$what" ] || [ ! -f "$root/$file" ] || ! sed -e "$substitution" "$root/$file" >"$copy" ||
-        cmp -s "$root/$file" "$copy"; then
-        echo "   NOT APPLIED"
-        status=1
-      else
-        diff "$root/$file" "$copy" | sed 's/^/   /' || true
-      fi
-    done <"$list"
+      "$handler" "$(basename "$list"):$number" "$file" "$substitution" "$what"
+    done 3<"$list"
   done
-  return $status
+}
+
+# --dry-run: the substitution applied to a copy of its file, and the change it makes.
+show_fault() {
+  local where=$1 file=$2 substitution=$3 what=$4 copy
+  echo "== $where  $what"
+  copy=$(mktemp)
+  if [ -z "$what" ] || [ ! -f "$root/$file" ] || ! sed -e "$substitution" "$root/$file" >"$copy" ||
+    cmp -s "$root/$file" "$copy"; then
+    echo "   NOT APPLIED"
+    dry_run_status=1
+  else
+    diff "$root/$file" "$copy" | sed 's/^/   /' || true
+  fi
+  rm -f "$copy"
 }
 
 if $dry_run; then
-  dry_run_all
-  exit
+  dry_run_status=0
+  each_fault show_fault
+  exit $dry_run_status
 fi
 
 mkdir -p "$scratch"
@@ -109,48 +118,44 @@ if ! run_tests; then
   exit 2
 fi
 
+# One fault: apply, rebuild, run the tests, put the file back.
+try_fault() {
+  local where=$1 file=$2 substitution=$3 what=$4 result
+  total=$((total + 1))
+  if [ -z "$file" ] || [ -z "$substitution" ] || [ -z "$what" ]; then
+    problems+=("MALFORMED  $where: expected file<TAB>substitution<TAB>description")
+    echo "  malformed    $where"
+    return
+  fi
+  if [ ! -f "$src/$file" ]; then
+    problems+=("NO FILE    $where: $file")
+    echo "  no file      $where  $file"
+    return
+  fi
+  if ! sed -i -e "$substitution" "$src/$file" 2>"$log" || cmp -s "$root/$file" "$src/$file"; then
+    cp "$root/$file" "$src/$file"
+    problems+=("NOT APPLIED $where: $file: $substitution")
+    echo "  not applied  $where  $what"
+    return
+  fi
+  if ! build_scratch; then
+    result="no build"
+    problems+=("NO BUILD   $where: $what (see scripts/mutants.sh --dry-run '$where')")
+  elif run_tests; then
+    result="MISSED"
+    problems+=("MISSED     $where: $what ($file: $substitution)")
+  else
+    result="caught"
+    caught=$((caught + 1))
+  fi
+  printf '  %-12s %s  %s\n' "$result" "$where" "$what"
+  # A fresh copy (new timestamp), so that the next build compiles the file again.
+  cp "$root/$file" "$src/$file"
+}
+
 total=0 caught=0
 problems=()
-shopt -s nullglob
-for list in "$root"/scripts/mutants/*.txt; do
-  number=0
-  while IFS= read -r line || [ -n "$line" ]; do
-    number=$((number + 1))
-    [[ -z "${line//[[:space:]]/}" || "$line" == \#* ]] && continue
-    [ -n "$pattern" ] && ! grep -qE -- "$pattern" <<<"$line" && continue
-    IFS=$'\t' read -r file substitution what <<<"$line"
-    where="$(basename "$list"):$number"
-    total=$((total + 1))
-    if [ -z "$file" ] || [ -z "$substitution" ] || [ -z "$what" ]; then
-      problems+=("MALFORMED  $where: expected file<TAB>substitution<TAB>description")
-      echo "  malformed    $where"
-      continue
-    fi
-    if [ ! -f "$src/$file" ]; then
-      problems+=("NO FILE    $where: $file")
-      echo "  no file      $where  $file"
-      continue
-    fi
-    if ! sed -i -e "$substitution" "$src/$file" 2>"$log" || cmp -s "$root/$file" "$src/$file"; then
-      cp "$root/$file" "$src/$file"
-      problems+=("NOT APPLIED $where: $file: $substitution")
-      echo "  not applied  $where  $what"
-      continue
-    fi
-    if ! build_scratch; then
-      result="no build"
-      problems+=("NO BUILD   $where: $what (see the compiler output with: scripts/mutants.sh '$substitution')")
-    elif run_tests; then
-      result="MISSED"
-      problems+=("MISSED     $where: $what ($file: $substitution)")
-    else
-      result="caught"
-      caught=$((caught + 1))
-    fi
-    printf '  %-12s %s  %s\n' "$result" "$where" "$what"
-    cp "$root/$file" "$src/$file"
-  done <"$list"
-done
+each_fault try_fault
 
 # Leave the scratch build matching the tree again.
 build_scratch || true

@@ -101,16 +101,22 @@ UNIT_TEST_SUITE(QuilletImportsMemory)
     TEST(HeapAlloc_ZeroMemoryFlag_ClearsTheBlock)
     {
         auto heapAlloc = Import<void*, void*, unsigned int, unsigned long>("HeapAlloc");
-        // Dirty a block of the same size first, so that the allocator likely hands it back.
-        void* dirty = malloc(200);
-        memset(dirty, 0xAB, 200);
+        // Dirty a block first that the allocator hands back for the same size: beyond the sizes
+        // it caches per thread, a freed block goes back to the heap (kept from the heap's end by
+        // a guard block, so that it is not given back to the system) and an exact fit reuses it.
+        // The volatile pointers keep the compiler from dropping the unused blocks altogether.
+        const size_t kSize = 4000;
+        void* volatile dirty = malloc(kSize);
+        void* volatile guard = malloc(64);
+        memset(dirty, 0xAB, kSize);
         free(dirty);
-        unsigned char* block = static_cast<unsigned char*>(heapAlloc(reinterpret_cast<void*>(1), 0x8, 200));
+        unsigned char* block = static_cast<unsigned char*>(heapAlloc(reinterpret_cast<void*>(1), 0x8, kSize));
         bool allZero = true;
-        for (int i = 0; i < 200; ++i)
+        for (size_t i = 0; i < kSize; ++i)
             allZero = allZero && block[i] == 0;
         CHECK(allZero);
         free(block);
+        free(guard);
         // A size no host can give yields null, with nothing cleared.
         CHECK(heapAlloc(reinterpret_cast<void*>(1), 0x8, uint64_t(1) << 62) == nullptr);
     }

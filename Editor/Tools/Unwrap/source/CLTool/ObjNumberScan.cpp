@@ -5,20 +5,6 @@
 #include <cstring>
 #include <xmmintrin.h>
 
-namespace
-{
-    // The blanks of the C locale, which both strtof and strtoul skip.
-    inline bool IsBlank(char c)
-    {
-        return c == ' ' || (c >= '\t' && c <= '\r');
-    }
-
-    inline bool IsDigit(char c)
-    {
-        return (unsigned)(c - '0') < 10;
-    }
-}
-
 namespace ObjNumberScan
 {
     // Rounding field (bits 13-14) to nearest, flush-to-zero (bit 15) and denormals-are-zero (bit 6) off.
@@ -78,27 +64,5 @@ namespace ObjNumberScan
             }
         }
         return ScanByStrtof(p, end, value);
-    }
-
-    const char* ScanUnsigned(const char* text, const char* end, uint32_t* value)
-    {
-        const char* p = text;
-        while (p < end && IsBlank(*p))
-            ++p;
-        bool negative = false;
-        if (p < end && (*p == '-' || *p == '+'))
-            negative = *p++ == '-';
-        if (p == end || !IsDigit(*p))
-            return nullptr;
-        uint64_t parsed = 0;
-        bool overflow = false;
-        for (; p < end && IsDigit(*p); ++p)
-            overflow |= __builtin_mul_overflow(parsed, 10u, &parsed) | __builtin_add_overflow(parsed, unsigned(*p - '0'), &parsed);
-        if (overflow)
-            parsed = ~0ull;
-        else if (negative)
-            parsed = 0 - parsed;
-        *value = (uint32_t)parsed;
-        return p;
     }
 }

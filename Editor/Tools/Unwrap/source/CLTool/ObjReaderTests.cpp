@@ -2,6 +2,7 @@
 // line-by-line formatted-input reading it stands for (fgets into a 1,024-byte buffer, sscanf with
 // "v %f %f %f", "vt %f %f" and "f %u/%u/%*u ..."), under the driver's rounding toward zero.
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
+#include "Editor/Tools/Unwrap/source/CLTool/ObjScanfReference.h"
 #include "Runtime/Testing/Testing.h"
 
 #include <cstdio>
@@ -69,48 +70,6 @@ namespace
     };
 
     const std::string kThreeCorners = "v 0 0 0\nv 4 0 0\nv 2 2 0\nvt 0.25 0.5\nvt 1 0\nvt 0 1\n";
-
-    // The reading the reader stands for, with the C library's own formatted input.
-    struct ReferenceObj
-    {
-        std::vector<float> positions, uvs, cornerUVs;
-        std::vector<uint32_t> tri;
-    };
-
-    ReferenceObj ReadWithScanf(const std::string& path)
-    {
-        ReferenceObj ref;
-        std::vector<uint32_t> cornerUV;
-        FILE* f = std::fopen(path.c_str(), "rt");
-        char line[1024];
-        while (f && std::fgets(line, sizeof line, f))
-        {
-            float a = 0, b = 0, c = 0;
-            uint32_t v[3], t[3];
-            if (line[0] == 'v' && line[1] == ' ')
-            {
-                std::sscanf(line, "v %f %f %f", &a, &b, &c);
-                ref.positions.insert(ref.positions.end(), {a, b, c});
-            }
-            else if (line[0] == 'v' && line[1] == 't' && line[2] == ' ')
-            {
-                std::sscanf(line, "vt %f %f", &a, &b);
-                ref.uvs.insert(ref.uvs.end(), {a, b});
-            }
-            else if (line[0] == 'f' && line[1] == ' ' &&
-                     std::sscanf(line, "f %u/%u/%*u %u/%u/%*u %u/%u/%*u", &v[0], &t[0], &v[1], &t[1], &v[2], &t[2]) == 6)
-                for (int k = 0; k < 3; ++k)
-                {
-                    ref.tri.push_back(v[k] - 1);
-                    cornerUV.push_back(t[k] - 1);
-                }
-        }
-        if (f)
-            std::fclose(f);
-        for (uint32_t k : cornerUV)
-            ref.cornerUVs.insert(ref.cornerUVs.end(), {ref.uvs[2 * (size_t)k], ref.uvs[2 * (size_t)k + 1]});
-        return ref;
-    }
 
     bool SameBits(const std::vector<float>& a, const std::vector<float>& b)
     {
@@ -187,7 +146,8 @@ UNIT_TEST_SUITE(ObjReader)
         CHECK_EQUAL("", obj.error);
         // The driver's rounding is back once the file is read (the sticky flags, bits 0-5, aside).
         CHECK_EQUAL((savedState | 0x6000u) & ~0x803Fu, _mm_getcsr() & ~0x3Fu);
-        ReferenceObj ref = ReadWithScanf(dir + "/mesh.obj");
+        ObjScanfReference ref;
+        CHECK(ReadObjWithScanf(dir + "/mesh.obj", &ref));
         CHECK_EQUAL(ref.positions.size() / 3, obj.vertexCount);
         CHECK(SameBits(ref.positions, obj.Vertices()));
         CHECK(ref.tri == obj.Triangles());
