@@ -95,8 +95,16 @@ std::string ReadDenseAccessor(const tinygltf::Model& model, int accessorIndex, D
         return AccessorError(accessorIndex, "has an unknown type");
     out->count = accessor.count;
     out->elementSize = (size_t)componentSize * (size_t)components;
-    if (out->count > (size_t)1 << 31)
-        return AccessorError(accessorIndex, "is too large");
+    // An accessor without a buffer view is zeros (plus sparse values) and costs nothing in the
+    // file; its dense copy is bounded by the file's data so that a forged count cannot ask for
+    // more memory than the file could plausibly need.
+    size_t dataBytes = 0;
+    for (const tinygltf::Buffer& buffer : model.buffers)
+        dataBytes += buffer.data.size();
+    size_t limit = 4 * dataBytes + ((size_t)64 << 20);
+    if (out->count > (size_t)1 << 31 || out->count * out->elementSize > limit)
+        return AccessorError(accessorIndex, "claims " + std::to_string(out->count) +
+                                                " elements, more than the file's data could hold");
     out->bytes.assign(out->count * out->elementSize, 0);
     std::string error;
     if (accessor.bufferView >= 0)

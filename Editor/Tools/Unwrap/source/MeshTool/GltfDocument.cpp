@@ -52,13 +52,7 @@ namespace
         const ImageTarget& target = *static_cast<const ImageTarget*>(user);
         if (!image->uri.empty())
         {
-            std::error_code ec;
-            fs::path source = fs::path(target.sourceDirectory) / image->uri;
-            fs::path relative = fs::relative(source, target.outputDirectory.empty() ? "." : target.outputDirectory, ec);
-            *outUri = ec || relative.empty() || IsSameFile(target.sourceDirectory.empty() ? "." : target.sourceDirectory,
-                                                            target.outputDirectory.empty() ? "." : target.outputDirectory)
-                          ? image->uri
-                          : relative.string();
+            *outUri = RelinkPath(image->uri, target.sourceDirectory, target.outputDirectory);
             return true;
         }
         *outUri = "data:" + (image->mimeType.empty() ? std::string("image/png") : image->mimeType) + ";base64," +

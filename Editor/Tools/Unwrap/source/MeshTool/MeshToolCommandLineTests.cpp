@@ -36,7 +36,14 @@ INTEGRATION_TEST_SUITE(ChartBakeMeshCommandLine)
         CHECK(Contains(r.out, "% of the atlas used, "));
         CHECK_EQUAL(1, (int)std::count(r.out.begin(), r.out.end(), '\n'));
         CHECK_EQUAL("", r.err);
-        Testing::ChildResult quiet = Run({"--quiet", "tri.obj", "quiet.glb"});
+        // Past the quiet time (here set to none), every stage is announced on standard error.
+        Testing::ChildResult progress = Run({"tri.obj", "progress.glb"}, {"CHARTBAKE_MESH_PROGRESS_AFTER=0"});
+        CHECK_EQUAL(0, progress.exitStatus);
+        CHECK(Contains(progress.err, "chartbake-mesh: reading... ("));
+        CHECK(Contains(progress.err, "chartbake-mesh: unwrapping... ("));
+        CHECK(Contains(progress.err, "chartbake-mesh: writing... ("));
+        CHECK(Contains(progress.out, "wrote progress.glb: 1 triangle, "));
+        Testing::ChildResult quiet = Run({"--quiet", "tri.obj", "quiet.glb"}, {"CHARTBAKE_MESH_PROGRESS_AFTER=0"});
         CHECK_EQUAL(0, quiet.exitStatus);
         CHECK_EQUAL("", quiet.out + quiet.err);
         CHECK(Exists("quiet.glb"));

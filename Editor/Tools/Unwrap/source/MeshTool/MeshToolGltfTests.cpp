@@ -7,10 +7,22 @@ using namespace MeshToolTest;
 
 namespace
 {
+    // The smallest valid PNG (1x1, grey), for the texture the scene refers to.
+    std::string TinyPng()
+    {
+        static const unsigned char bytes[] = {
+            0x89, 0x50, 0x4E, 0x47, 0x0D, 0x0A, 0x1A, 0x0A, 0x00, 0x00, 0x00, 0x0D, 0x49, 0x48, 0x44, 0x52, 0x00, 0x00,
+            0x00, 0x01, 0x00, 0x00, 0x00, 0x01, 0x08, 0x00, 0x00, 0x00, 0x00, 0x3A, 0x7E, 0x9B, 0x55, 0x00, 0x00, 0x00,
+            0x0A, 0x49, 0x44, 0x41, 0x54, 0x78, 0x9C, 0x63, 0x68, 0x00, 0x00, 0x00, 0x82, 0x00, 0x81, 0x4C, 0x17, 0xD7,
+            0xDF, 0x00, 0x00, 0x00, 0x00, 0x49, 0x45, 0x4E, 0x44, 0xAE, 0x42, 0x60, 0x82};
+        return std::string(reinterpret_cast<const char*>(bytes), sizeof bytes);
+    }
+
     // Two meshes (cubes side by side, each with normals, UVs and a material), a points primitive
     // that must stay as it is, an animation whose accessors must keep their numbers, an external
     // texture image and extras.
-    GltfBuilder TwoCubeScene()
+    // `embeddedImage`: the texture lives in the buffer (as in most .glb files), else in albedo.png.
+    GltfBuilder TwoCubeScene(bool embeddedImage = false)
     {
         GltfBuilder b;
         tinygltf::Model& m = b.model;
@@ -78,7 +90,14 @@ namespace
         m.animations.push_back(animation);
 
         tinygltf::Image image;
-        image.uri = "albedo.png";
+        if (embeddedImage)
+        {
+            std::string png = TinyPng();
+            image.bufferView = b.View(png.data(), png.size());
+            image.mimeType = "image/png";
+        }
+        else
+            image.uri = "albedo.png";
         m.images.push_back(image);
         tinygltf::Texture texture;
         texture.source = 0;
@@ -97,17 +116,6 @@ namespace
         m.scenes.push_back(scene);
         m.defaultScene = 0;
         return b;
-    }
-
-    // The smallest valid PNG (1x1, grey), for the texture the scene refers to.
-    std::string TinyPng()
-    {
-        static const unsigned char bytes[] = {
-            0x89, 0x50, 0x4E, 0x47, 0x0D, 0x0A, 0x1A, 0x0A, 0x00, 0x00, 0x00, 0x0D, 0x49, 0x48, 0x44, 0x52, 0x00, 0x00,
-            0x00, 0x01, 0x00, 0x00, 0x00, 0x01, 0x08, 0x00, 0x00, 0x00, 0x00, 0x3A, 0x7E, 0x9B, 0x55, 0x00, 0x00, 0x00,
-            0x0A, 0x49, 0x44, 0x41, 0x54, 0x78, 0x9C, 0x63, 0x68, 0x00, 0x00, 0x00, 0x82, 0x00, 0x81, 0x4C, 0x17, 0xD7,
-            0xDF, 0x00, 0x00, 0x00, 0x00, 0x49, 0x45, 0x4E, 0x44, 0xAE, 0x42, 0x60, 0x82};
-        return std::string(reinterpret_cast<const char*>(bytes), sizeof bytes);
     }
 }
 
@@ -175,6 +183,26 @@ INTEGRATION_TEST_SUITE(ChartBakeMeshGltf)
         CHECK(sharedArea[0] + sharedArea[1] <= 1.0);
         CHECK(ownArea[0] > 1.5 * sharedArea[0]);
         CHECK_EQUAL("errors 0 warnings 0\n", Validate("own.glb").out);
+    }
+
+    TEST_FIXTURE(MeshToolFixture, Glb_EmbeddedImage_StaysInTheBuffer)
+    {
+        Write("scene.glb", TwoCubeScene(true).Bytes(true));
+        CHECK_EQUAL(0, Run({"scene.glb", "out.glb"}).exitStatus);
+        CHECK_EQUAL("errors 0 warnings 0\n", Validate("out.glb").out);
+        GltfDocument original, output;
+        if (!LoadOutput("scene.glb", &original) || !LoadOutput("out.glb", &output))
+        {
+            CHECK(false);
+            return;
+        }
+        CHECK_EQUAL("", CompareLightmapped(original.model, output.model));
+        const tinygltf::Image& image = output.model.images.at(0);
+        CHECK(image.uri.empty());
+        const tinygltf::BufferView& view = output.model.bufferViews.at((size_t)image.bufferView);
+        const std::vector<unsigned char>& buffer = output.model.buffers.at(0).data;
+        CHECK_EQUAL(TinyPng(), std::string(buffer.begin() + (long)view.byteOffset,
+                                           buffer.begin() + (long)(view.byteOffset + view.byteLength)));
     }
 
     TEST_FIXTURE(MeshToolFixture, Glb_StripFanAndUnindexedPrimitives_BecomeValidTriangleLists)

@@ -17,6 +17,8 @@
 #include "Runtime/Logging/LogAssert.h"
 
 #include <cstdio>
+#include <exception>
+#include <new>
 #include <filesystem>
 
 namespace
@@ -89,5 +91,18 @@ int main(int argc, char** argv)
         case ParsedCommandLine::kRun:
             break;
     }
-    return Run(command.options);
+    // Hardening: a file that asks for more memory than there is, or trips a library, still ends
+    // with a message and status 1 (and, outputs being committed last, without an output).
+    try
+    {
+        return Run(command.options);
+    }
+    catch (const std::bad_alloc&)
+    {
+        return Fail("out of memory reading " + command.options.inputPath);
+    }
+    catch (const std::exception& e)
+    {
+        return Fail(std::string("failed: ") + e.what());
+    }
 }

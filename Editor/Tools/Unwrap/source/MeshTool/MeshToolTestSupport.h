@@ -57,10 +57,10 @@ namespace MeshToolTest
             return count;
         }
 
-        Testing::ChildResult Run(std::vector<std::string> args) const
+        Testing::ChildResult Run(std::vector<std::string> args, const std::vector<std::string>& env = {}) const
         {
             args.insert(args.begin(), kBinDir + "/chartbake-mesh");
-            return Testing::RunProgram(args, dir);
+            return Testing::RunProgram(args, dir, env);
         }
 
         // The validator's verdict: its last line ("errors N warnings M") and any error lines.

@@ -1,5 +1,6 @@
 #include "Editor/Tools/Unwrap/source/MeshTool/ObjWriter.h"
 
+#include "Editor/Tools/Unwrap/source/MeshTool/OutputFiles.h"
 #include "Editor/Tools/Unwrap/source/MeshTool/VertexSplit.h"
 
 #include <cstdio>
@@ -43,12 +44,7 @@ namespace
             if (material.color[3] < 1)
                 Line(&mtl, "d %.9g\n", material.color[3], 0, 0, false);
             if (!material.texture.empty())
-            {
-                std::error_code ec;
-                fs::path relative = fs::relative(fs::path(scene.sourceDirectory) / material.texture,
-                                                 outputDirectory.empty() ? "." : outputDirectory, ec);
-                mtl += "map_Kd " + (ec || relative.empty() ? material.texture : relative.string()) + "\n";
-            }
+                mtl += "map_Kd " + RelinkPath(material.texture, scene.sourceDirectory, outputDirectory) + "\n";
         }
         return mtl;
     }

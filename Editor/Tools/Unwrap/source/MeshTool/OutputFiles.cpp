@@ -91,3 +91,14 @@ std::string LowerExtension(const std::string& path)
     std::transform(ext.begin(), ext.end(), ext.begin(), [](unsigned char c) { return (char)std::tolower(c); });
     return ext;
 }
+
+std::string RelinkPath(const std::string& path, const std::string& sourceDirectory, const std::string& outputDirectory)
+{
+    std::string from = sourceDirectory.empty() ? "." : sourceDirectory;
+    std::string to = outputDirectory.empty() ? "." : outputDirectory;
+    if (path.empty() || fs::path(path).is_absolute() || path.find("://") != std::string::npos || IsSameFile(from, to))
+        return path;
+    std::error_code ec;
+    fs::path relative = fs::relative(fs::path(from) / path, to, ec);
+    return ec || relative.empty() ? path : relative.string();
+}

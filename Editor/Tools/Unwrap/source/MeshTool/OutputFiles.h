@@ -25,3 +25,8 @@ bool IsSameFile(const std::string& a, const std::string& b);
 
 // The lower-case extension with its dot (".glb"), or empty.
 std::string LowerExtension(const std::string& path);
+
+// A file the input refers to by `path` (relative to `sourceDirectory`), named so that it is found
+// from `outputDirectory`. Absolute paths and URLs stay as they are, and so does everything when
+// both directories are the same.
+std::string RelinkPath(const std::string& path, const std::string& sourceDirectory, const std::string& outputDirectory);

@@ -1,14 +1,24 @@
 #include "Editor/Tools/Unwrap/source/MeshTool/Progress.h"
 
 #include <cstdio>
+#include <cstdlib>
 
 namespace
 {
-    const double kQuietSeconds = 1.0;
     const double kReminderSeconds = 5.0;
+
+    // One second, unless CHARTBAKE_MESH_PROGRESS_AFTER names other seconds (tests set 0).
+    double QuietSeconds()
+    {
+        const char* text = std::getenv("CHARTBAKE_MESH_PROGRESS_AFTER");
+        char* end = nullptr;
+        double seconds = text && *text ? std::strtod(text, &end) : 1.0;
+        return end && *end == '\0' && seconds >= 0 ? seconds : 1.0;
+    }
 }
 
-Progress::Progress(bool enabled) : m_Enabled(enabled), m_Start(std::chrono::steady_clock::now())
+Progress::Progress(bool enabled)
+    : m_Enabled(enabled), m_Start(std::chrono::steady_clock::now()), m_QuietSeconds(QuietSeconds())
 {
     if (m_Enabled)
         m_Watcher = std::thread(&Progress::Watch, this);
@@ -35,7 +45,7 @@ void Progress::Stage(const char* name)
     std::lock_guard<std::mutex> lock(m_Mutex);
     m_Stage = name;
     m_LastAnnounced = -1;
-    if (m_Enabled && Seconds() >= kQuietSeconds)
+    if (m_Enabled && Seconds() >= m_QuietSeconds)
         AnnounceLocked();
 }
 
@@ -55,7 +65,7 @@ void Progress::Watch()
         if (m_Done || m_Stage.empty())
             continue;
         double now = Seconds();
-        if (now >= kQuietSeconds && (m_LastAnnounced < 0 || now - m_LastAnnounced >= kReminderSeconds))
+        if (now >= m_QuietSeconds && (m_LastAnnounced < 0 || now - m_LastAnnounced >= kReminderSeconds))
             AnnounceLocked();
     }
 }

@@ -1,7 +1,8 @@
 #pragma once
 // Progress on standard error for runs that take a while: nothing during the first second; after
 // that, a line for the stage running then and for every stage that follows, with the time
-// elapsed since the start, and a reminder every five seconds during a long stage.
+// elapsed since the start, and a reminder every five seconds during a long stage. The environment
+// variable CHARTBAKE_MESH_PROGRESS_AFTER sets other seconds than the first one (0: always).
 
 #include <chrono>
 #include <condition_variable>
@@ -24,6 +25,7 @@ private:
 
     bool m_Enabled;
     std::chrono::steady_clock::time_point m_Start;
+    double m_QuietSeconds;          // nothing is printed before this much time has passed
     std::mutex m_Mutex;
     std::condition_variable m_Wake;
     std::string m_Stage;
