@@ -51,10 +51,7 @@ namespace
             return "Failed to load DLL: entry point outside the image";
         return nullptr;
     }
-}
 
-namespace
-{
     // The memory form's steps; `runEntry` false stops after binding (see quillet_PELoaderInternal.h).
     PEModule* LoadFromMemory(const void* data, size_t size, const PEKnownImport* imports, uint32_t importCount,
                              const char** outErrorMsg, bool runEntry)
