@@ -87,13 +87,6 @@ namespace
     }
 }
 
-double EffectiveMargin(uint32_t chartCount, double packMargin)
-{
-    double columns = ceil(Sqrt((double)chartCount));
-    double limit = 0.5 / ((columns < 1 ? 1 : columns) + 1);
-    return packMargin < limit ? packMargin : limit;
-}
-
 bool PackCharts(const ChartBox* boxes, uint32_t chartCount, double margin, double* scale, ChartPlacement* placements)
 {
     Scratch<uint32_t> order;

@@ -13,10 +13,6 @@ struct ChartPlacement
     double x, y;   // lower-left corner of the chart's box in the unit square
 };
 
-// The margin actually used for `chartCount` charts: `packMargin`, shrunk (as for the grid layout)
-// so that the margins alone never fill more than half of the square's side.
-double EffectiveMargin(uint32_t chartCount, double packMargin);
-
 // Fills placements[chartCount] and *scale. False when scratch memory runs out, or when the charts
-// do not fit even at scale 0 (which EffectiveMargin rules out).
+// do not fit even at scale 0 (too many charts for the margin).
 bool PackCharts(const ChartBox* boxes, uint32_t chartCount, double margin, double* scale, ChartPlacement* placements);

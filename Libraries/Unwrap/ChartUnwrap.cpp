@@ -1,7 +1,8 @@
 #include "ChartUnwrap.h"
 
+#include "AtlasPacking.h"
 #include "ChartOverlap.h"
-#include "ChartPacking.h"
+#include "ChartProjection.h"
 #include "ChartSegmentation.h"
 #include "MeshAdjacency.h"
 #include "Scratch.h"
@@ -22,14 +23,13 @@ namespace
         // lowest triangle of every chart already projected.
         Scratch<ChartBox> boxAt, boxes;
         Scratch<uint8_t> projected;
-        Scratch<ChartPlacement> placements;
 
         bool Allocate(uint32_t triCount)
         {
             return cross.Allocate(triCount) && degenerate.Allocate(triCount) && twin.Allocate(3ull * triCount) &&
                    chartOf.Allocate(triCount) && queue.Allocate(3ull * triCount) && start.Allocate(2ull * triCount + 1) &&
                    triangles.Allocate(triCount) && boxAt.Allocate(triCount) && boxes.Allocate(triCount) &&
-                   projected.Allocate(triCount) && placements.Allocate(triCount);
+                   projected.Allocate(triCount);
         }
     };
 
@@ -111,22 +111,6 @@ namespace
         }
     }
 
-    // Moves every chart to its place at the common scale.
-    void PlaceCharts(const Workspace& w, uint32_t charts, double scale, float* outUV)
-    {
-        for (uint32_t c = 0; c < charts; ++c)
-        {
-            const ChartPlacement& at = w.placements[c];
-            for (uint32_t i = w.start[c]; i < w.start[c + 1]; ++i)
-                for (uint32_t k = 6 * w.triangles[i]; k < 6 * w.triangles[i] + 6; k += 2)
-                {
-                    double u = at.x + scale * outUV[k], v = at.y + scale * outUV[k + 1];
-                    outUV[k] = (float)(u < 0 ? 0 : (u > 1 ? 1 : u));
-                    outUV[k + 1] = (float)(v < 0 ? 0 : (v > 1 ? 1 : v));
-                }
-        }
-    }
-
     GrowLimits LimitsFrom(const UnwrapParam& param, uint32_t triCount)
     {
         const double degrees = 3.14159265358979323846 / 180;
@@ -152,9 +136,5 @@ bool UnwrapIntoCharts(const float* vertex, uint32_t vertexCount, const uint32_t*
         return (*error = kOutOfMemory), false;
     ChartMesh mesh = {vertex, tri, triCount, w.cross.Data(), w.degenerate.Data(), w.twin.Data(), srcPoly};
     uint32_t charts = MakeCharts(mesh, w, LimitsFrom(param, triCount), outUV);
-    double scale = 0;
-    if (!PackCharts(w.boxes.Data(), charts, EffectiveMargin(charts, param.packMargin), &scale, w.placements.Data()))
-        return (*error = "the charts could not be packed into the unit square"), false;
-    PlaceCharts(w, charts, scale, outUV);
-    return true;
+    return PackAtlas(outUV, w.chartOf.Data(), triCount, charts, param.packMargin, error);
 }
