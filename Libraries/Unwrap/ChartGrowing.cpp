@@ -1,0 +1,140 @@
+#include "ChartGrowing.h"
+
+#include "MeshAdjacency.h"
+#include "WinImports.h"
+
+namespace
+{
+    Vec3 Centroid(const ChartMesh& mesh, uint32_t t)
+    {
+        const uint32_t* v = mesh.tri + 3 * t;
+        return (Position(mesh.vertex, v[0]) + Position(mesh.vertex, v[1]) + Position(mesh.vertex, v[2])) * (1.0 / 3);
+    }
+
+    double EdgeLength(const ChartMesh& mesh, uint32_t h)
+    {
+        return Length(Position(mesh.vertex, mesh.tri[NextCorner(h)]) - Position(mesh.vertex, mesh.tri[h]));
+    }
+}
+
+bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
+{
+    m_Mesh = &mesh;
+    m_ChartOf = chartOf;
+    if (!m_Heap.Allocate(4ull * mesh.triCount + 16) || !m_Proxy.Allocate(mesh.triCount + 1ull) || !m_Distance.Allocate(mesh.triCount + 1ull) ||
+        !m_Rejected.Allocate(mesh.triCount + 1ull) || !m_Queued.Allocate(mesh.triCount + 1ull))
+        return false;
+    memset(m_Queued.Data(), 0, mesh.triCount);
+    return true;
+}
+
+double ChartGrower::Cost(uint32_t f, uint32_t c, const GrowRules& rules) const
+{
+    const ChartMesh& mesh = *m_Mesh;
+    double perimeter = 0, shared = 0;
+    for (uint32_t h = 3 * f; h < 3 * f + 3; ++h)
+    {
+        double length = EdgeLength(mesh, h);
+        perimeter += length;
+        if (mesh.twin[h] != kNoTwin && m_ChartOf[mesh.twin[h] / 3] == c)
+            shared += length;
+    }
+    double deviation = 1 - Dot(mesh.normal[f], Normalized(m_Proxy[c].normalSum));
+    return deviation + rules.compactness * (perimeter > 0 ? (perimeter - 2 * shared) / perimeter : 0);
+}
+
+bool ChartGrower::Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const
+{
+    const ChartProxy& proxy = m_Proxy[c];
+    if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], Normalized(proxy.normalSum)) >= rules.cosNormalLimit))
+        return false;
+    return proxy.curvature + m_Mesh->curvature[f] <= rules.curvatureLimit;
+}
+
+void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rules)
+{
+    ChartProxy& proxy = m_Proxy[c];
+    m_ChartOf[f] = c;
+    m_Distance[f] = cost;
+    if (!rules.fixedProxies)
+        proxy.normalSum = proxy.normalSum + m_Mesh->normal[f] * m_Mesh->area[f];
+    proxy.curvature += m_Mesh->curvature[f];
+    proxy.area += m_Mesh->area[f];
+}
+
+void ChartGrower::PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules)
+{
+    for (uint32_t h = 3 * t; h < 3 * t + 3; ++h)
+    {
+        uint32_t twin = m_Mesh->twin[h];
+        if (twin == kNoTwin || m_ChartOf[twin / 3] != kNoChart)
+            continue;
+        uint32_t w = twin / 3;
+        double cost = rules.geodesic ? m_Distance[t] + Length(Centroid(*m_Mesh, w) - Centroid(*m_Mesh, t)) : Cost(w, c, rules);
+        m_Heap.Push({cost, w, c});   // room for 3 a triangle added, plus one a seed
+    }
+}
+
+void ChartGrower::Reject(uint32_t f)
+{
+    if (m_Queued[f])
+        return;
+    m_Queued[f] = 1;
+    m_Rejected[m_RejectedTail++] = f;
+}
+
+void ChartGrower::Seed(uint32_t seed, uint32_t chart, const GrowRules& rules)
+{
+    ChartProxy& proxy = m_Proxy[chart];
+    if (!rules.fixedProxies)
+        proxy.normalSum = {0, 0, 0};
+    proxy.curvature = proxy.area = 0;
+    Add(seed, chart, 0, rules);
+    PushNeighbours(seed, chart, rules);
+}
+
+void ChartGrower::Grow(const GrowRules& rules)
+{
+    while (!m_Heap.Empty())
+    {
+        HeapEntry entry = m_Heap.Pop();
+        uint32_t f = entry.triangle;
+        if (m_ChartOf[f] != kNoChart)
+            continue;
+        if (!Admissible(f, entry.chart, rules))
+        {
+            Reject(f);
+            continue;
+        }
+        Add(f, entry.chart, entry.cost, rules);
+        PushNeighbours(f, entry.chart, rules);
+    }
+}
+
+void ChartGrower::GrowRemaining(const uint32_t* candidates, uint32_t count, const GrowRules& rules, uint32_t* nextChart)
+{
+    uint32_t next = 0;
+    for (;;)
+    {
+        uint32_t seed = kNoChart;
+        while (seed == kNoChart && m_RejectedHead < m_RejectedTail)
+        {
+            uint32_t f = m_Rejected[m_RejectedHead++];
+            m_Queued[f] = 0;
+            seed = m_ChartOf[f] == kNoChart ? f : kNoChart;
+        }
+        while (seed == kNoChart && next < count)
+        {
+            uint32_t f = candidates ? candidates[next] : next;
+            ++next;
+            seed = m_ChartOf[f] == kNoChart && !m_Mesh->degenerate[f] ? f : kNoChart;
+        }
+        if (seed == kNoChart)
+            break;
+        GrowRules sequential = rules;
+        sequential.fixedProxies = false;
+        Seed(seed, (*nextChart)++, sequential);
+        Grow(sequential);
+    }
+    m_RejectedHead = m_RejectedTail = 0;
+}

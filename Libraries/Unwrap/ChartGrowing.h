@@ -1,0 +1,74 @@
+// Chart growing, the engine of segmentation (stage 2) and of chart splitting (stage 3).
+//
+// Charts grow over linked edges (ChartMesh::twin) into triangles not yet in a chart, cheapest
+// first from one priority queue shared by all charts growing at once. The cost of adding
+// triangle f to chart c is
+//     (1 - n_f . N_c) + compactness * (perimeter of f - 2 * length of f's edges already in c) / perimeter of f
+// with N_c the chart's proxy normal (its area-weighted mean normal): charts stay close to a
+// plane where possible and grow round rather than in fingers (short seams). A triangle is
+// admissible only while n_f . N_c >= cosNormalLimit and the chart's curvature (the sum of
+// ChartMesh::curvature over its triangles) stays within curvatureLimit: a chart may curve, but
+// only as far as a conformal map can flatten it with little area distortion.
+// Proxies either follow each chart as it grows, or stay fixed for a round (Lloyd iteration).
+// For splitting, the cost can instead be the distance from the chart's seed (through triangle
+// centroids), so that two seeds share a chart evenly, as Voronoi regions do.
+// Every order is decided by costs, then triangle numbers: runs are reproducible bit for bit.
+// Cost: O(n log n) for n triangles grown; memory 16 bytes a pushed candidate (at most 4 a triangle).
+#pragma once
+
+#include "ChartMesh.h"
+#include "MinHeap.h"
+
+struct GrowRules
+{
+    double cosNormalLimit;   // below -1: no limit
+    double curvatureLimit;   // radians of angle defect a chart may hold
+    double compactness;
+    bool fixedProxies;
+    bool geodesic;   // cost: distance from the seed across triangle centroids instead (even splits)
+};
+
+struct ChartProxy
+{
+    Vec3 normalSum;   // sum of area * normal over the chart's triangles (or fixed for a round)
+    double curvature;
+    double area;
+};
+
+class ChartGrower
+{
+public:
+    // chartOf has one entry a triangle; proxies room for one a triangle (charts are never more).
+    bool Allocate(const ChartMesh& mesh, uint32_t* chartOf);
+
+    ChartProxy* Proxies() { return m_Proxy.Data(); }
+
+    // Puts `seed` into chart `chart` (a fresh proxy from the seed unless the rules fix proxies, in
+    // which case the proxy's normalSum is kept and its curvature and area restart from the seed).
+    void Seed(uint32_t seed, uint32_t chart, const GrowRules& rules);
+
+    // Grows all seeded charts until no admissible candidate is left.
+    void Grow(const GrowRules& rules);
+
+    // Gives every triangle of `candidates` (all triangles when null; `count` of them) still outside
+    // a chart and not degenerate a chart: charts are started one at a time, each from the first
+    // triangle a previous chart turned down, else from the next candidate in order, and grown to
+    // the end before the next starts. Numbers new charts from *nextChart on.
+    void GrowRemaining(const uint32_t* candidates, uint32_t count, const GrowRules& rules, uint32_t* nextChart);
+
+private:
+    double Cost(uint32_t f, uint32_t c, const GrowRules& rules) const;
+    void PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules);
+    void Reject(uint32_t f);
+    bool Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const;
+    void Add(uint32_t f, uint32_t c, double cost, const GrowRules& rules);
+
+    const ChartMesh* m_Mesh = nullptr;
+    uint32_t* m_ChartOf = nullptr;
+    MinHeap m_Heap;
+    Scratch<ChartProxy> m_Proxy;
+    Scratch<double> m_Distance;     // geodesic rules: each grown triangle's distance from its seed
+    Scratch<uint32_t> m_Rejected;   // FIFO of triangles some chart turned down
+    Scratch<uint8_t> m_Queued;      // 1 once a triangle is in m_Rejected
+    uint32_t m_RejectedHead = 0, m_RejectedTail = 0;
+};
