@@ -60,7 +60,8 @@ namespace
                 if (!m_Mapper.Flatten(triangles, count, &flat))
                     return false;
                 ChartMeasure measure = {0, 0};
-                if (count == 1 || ChartIsValid(m_Mesh, m_ChartOf, r.chart, triangles, count, flat, m_Limits, &measure))
+                SplitSeeds seeds = {kNoChart, kNoChart};
+                if (count == 1 || ChartIsValid(m_Mesh, m_ChartOf, r.chart, triangles, count, flat, m_Limits, &measure, &seeds))
                 {
                     if (!TurnToSmallestBox(flat.uv.Data(), flat.vertexCount))
                         return false;
@@ -71,7 +72,7 @@ namespace
                     continue;
                 }
                 ++stats->splits;
-                Split(r);
+                Split(r, seeds);
             }
             stats->angleDistortion = area > 0 ? stats->angleDistortion / area : 0;
             stats->areaDistortion = area > 0 ? stats->areaDistortion / area : 0;
@@ -124,12 +125,16 @@ namespace
             return best;
         }
 
-        void Split(const Range& r)
+        void Split(const Range& r, const SplitSeeds& seeds)
         {
             for (uint32_t i = r.begin; i < r.end; ++i)
                 m_ChartOf[m_Members[i]] = kNoChart;
-            uint32_t a = Farthest(r, m_Members[r.begin]);
-            uint32_t b = Farthest(r, a);
+            uint32_t a = seeds.a, b = seeds.b;
+            if (a == kNoChart || b == kNoChart || a == b)
+            {
+                a = Farthest(r, m_Members[r.begin]);
+                b = Farthest(r, a);
+            }
             const GrowRules open = {-2, 1e300, 0, false, true};
             uint32_t firstNew = m_NextChart;
             m_Grower.Seed(a, r.chart, open);

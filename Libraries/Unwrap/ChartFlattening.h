@@ -5,8 +5,9 @@
 // Output: outUV (6 floats a triangle) in mesh units, each chart turned to its smallest bounding
 // rectangle (ChartOrientation.h), and
 // chartOf for every triangle with charts 0 .. (returned count)-1.
-// Splitting: two seeds as far apart as the chart's linked edges allow (the farthest triangle from
-// the chart's first, then the farthest from that one), grown at once with no limits
+// Splitting: two seeds on either side of the place where the chart failed (ChartValidity.h), or,
+// for distortion, as far apart as the chart's linked edges allow (the farthest triangle from the
+// chart's first, then the farthest from that one), grown at once by distance, with no other limits
 // (ChartGrowing.h); triangles neither reaches (a chart in pieces) get charts of their own. Every
 // split makes charts strictly smaller and a single triangle always passes, so this ends.
 // Degenerate triangles then join a chart that holds all three of their vertices (taking those

@@ -43,12 +43,48 @@ double ChartGrower::Cost(uint32_t f, uint32_t c, const GrowRules& rules) const
     return deviation + rules.compactness * (perimeter > 0 ? (perimeter - 2 * shared) / perimeter : 0);
 }
 
+// Adding f to chart c would break the chart at one of f's corners: either pinch it (the vertex
+// already belongs to c, but neither of f's edges at it links to a triangle of c, so the chart
+// would touch itself there), or wrap it (the chart's 3D angles around the vertex would pass
+// 2 pi - kWrapMargin while the fan stays open: its conformal map would fold over itself).
+bool ChartGrower::BreaksAtCorner(uint32_t f, uint32_t c) const
+{
+    const double kWrapMargin = 0.35;   // 20 degrees
+    const double kFullTurn = 6.283185307179586;
+    const ChartMesh& mesh = *m_Mesh;
+    for (uint32_t k = 0; k < 3; ++k)
+    {
+        uint32_t h = 3 * f + k, previous = 3 * f + (k + 2) % 3;   // the two edges at corner k
+        bool linked = (mesh.twin[h] != kNoTwin && m_ChartOf[mesh.twin[h] / 3] == c) ||
+                      (mesh.twin[previous] != kNoTwin && m_ChartOf[mesh.twin[previous] / 3] == c);
+        uint32_t v = mesh.tri[h];
+        double angle = mesh.cornerAngle[h];
+        uint32_t inChart = 1, all = mesh.aroundStart[v + 1] - mesh.aroundStart[v];
+        for (uint32_t i = mesh.aroundStart[v]; i < mesh.aroundStart[v + 1]; ++i)
+        {
+            uint32_t t = mesh.around[i];
+            if (m_ChartOf[t] != c)
+                continue;
+            if (!linked)
+                return true;
+            ++inChart;
+            for (uint32_t j = 0; j < 3; ++j)
+                angle += mesh.tri[3 * t + j] == v ? mesh.cornerAngle[3 * t + j] : 0;
+        }
+        if (angle > kFullTurn - kWrapMargin && inChart < all)
+            return true;
+    }
+    return false;
+}
+
 bool ChartGrower::Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const
 {
+    if (BreaksAtCorner(f, c))
+        return false;
     const ChartProxy& proxy = m_Proxy[c];
     if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], Normalized(proxy.normalSum)) >= rules.cosNormalLimit))
         return false;
-    return proxy.curvature + m_Mesh->curvature[f] <= rules.curvatureLimit;
+    return Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit;
 }
 
 void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rules)

@@ -7,8 +7,12 @@
 // with N_c the chart's proxy normal (its area-weighted mean normal): charts stay close to a
 // plane where possible and grow round rather than in fingers (short seams). A triangle is
 // admissible only while n_f . N_c >= cosNormalLimit and the chart's curvature (the sum of
-// ChartMesh::curvature over its triangles) stays within curvatureLimit: a chart may curve, but
-// only as far as a conformal map can flatten it with little area distortion.
+// ChartMesh::curvature over its triangles, in absolute value) stays within curvatureLimit: a chart may curve, but
+// only as far as a conformal map can flatten it with little area distortion. Nor may a triangle
+// pinch its chart (a corner already in the chart must be reached through one of the triangle's
+// own edges there, so charts never touch themselves at a vertex) or wrap it (the chart's 3D
+// angles around a vertex it does not surround stay 20 degrees short of a full turn): no
+// flattening survives either.
 // Proxies either follow each chart as it grows, or stay fixed for a round (Lloyd iteration).
 // For splitting, the cost can instead be the distance from the chart's seed (through triangle
 // centroids), so that two seeds share a chart evenly, as Voronoi regions do.
@@ -22,7 +26,7 @@
 struct GrowRules
 {
     double cosNormalLimit;   // below -1: no limit
-    double curvatureLimit;   // radians of angle defect a chart may hold
+    double curvatureLimit;   // radians of total angle defect (either sign) a chart may hold
     double compactness;
     bool fixedProxies;
     bool geodesic;   // cost: distance from the seed across triangle centroids instead (even splits)
@@ -61,6 +65,7 @@ private:
     void PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules);
     void Reject(uint32_t f);
     bool Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const;
+    bool BreaksAtCorner(uint32_t f, uint32_t c) const;
     void Add(uint32_t f, uint32_t c, double cost, const GrowRules& rules);
 
     const ChartMesh* m_Mesh = nullptr;

@@ -17,10 +17,13 @@ struct ChartMesh
     uint32_t triCount;
     const Vec3* normal;         // unit normal, (0, 0, 0) for a degenerate triangle
     const double* area;         // 3D area
-    const double* curvature;    // |angle defect| share of each triangle (MeshPreparation.h)
+    const double* curvature;    // signed angle defect share of each triangle (MeshPreparation.h)
     const uint8_t* degenerate;  // 1 for a triangle of (numerically) zero area
     const uint32_t* twin;       // 3 a triangle, kNoTwin where an edge links nothing or is a seam
     const uint32_t* srcPoly;    // source polygon of each triangle, or null
+    const uint32_t* aroundStart;   // vertex v's non-degenerate triangles: around[aroundStart[v] .. aroundStart[v + 1])
+    const uint32_t* around;
+    const float* cornerAngle;      // 3D angle at each corner (3 a triangle)
 };
 
 // Fills normal[], area[] and degenerate[] for every triangle. A triangle counts as degenerate when

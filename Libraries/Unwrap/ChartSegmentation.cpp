@@ -193,7 +193,7 @@ namespace
                 Vec3 axis = Normalized(proxy[a].normalSum + proxy[b].normalSum);
                 bool fits = AngleBetweenUnit(axis, cone[a].axis) + cone[a].halfAngle <= angleLimit &&
                             AngleBetweenUnit(axis, cone[b].axis) + cone[b].halfAngle <= angleLimit &&
-                            proxy[a].curvature + proxy[b].curvature <= rules.curvatureLimit;
+                            Abs(proxy[a].curvature + proxy[b].curvature) <= rules.curvatureLimit;
                 if (fits)
                 {
                     best = b;

@@ -66,14 +66,17 @@ namespace
         return mesh.twin[h] == kNoTwin || chartOf[mesh.twin[h] / 3] != chart;
     }
 
-    // Fans and boundary vertices; lists the boundary edges (2 chart vertices each) in `edges`.
+    // Fans and boundary vertices; lists the boundary edges in `edges` (3 entries each: its two
+    // chart vertices and its triangle). On a failure at a vertex, *seeds gets two of the
+    // vertex's chart triangles on either side of the trouble, when the vertex has them.
     bool FansClosed(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t chart, const uint32_t* triangles, uint32_t count,
-                    const FlatChart& flat, uint32_t* edges, uint32_t* edgeCount)
+                    const FlatChart& flat, uint32_t* edges, uint32_t* edgeCount, SplitSeeds* seeds)
     {
         uint32_t n = flat.vertexCount;
         Scratch<double> angleSum;
-        Scratch<uint32_t> in, out;
-        if (!angleSum.Allocate(n) || !in.Allocate(n) || !out.Allocate(n))
+        Scratch<uint32_t> in, out, firstOut, lastOut, lastIn;
+        if (!angleSum.Allocate(n) || !in.Allocate(n) || !out.Allocate(n) || !firstOut.Allocate(n) || !lastOut.Allocate(n) ||
+            !lastIn.Allocate(n))
             return false;
         memset(angleSum.Data(), 0, n * sizeof(double));
         memset(in.Data(), 0, n * sizeof(uint32_t));
@@ -87,18 +90,27 @@ namespace
                 angleSum[a] += UVAngle(UV(flat, a), UV(flat, b), UV(flat, k[(c + 2) % 3]));
                 if (IsBoundary(mesh, chartOf, chart, 3 * triangles[i] + c))
                 {
+                    firstOut[a] = out[a] == 0 ? triangles[i] : firstOut[a];
+                    lastOut[a] = triangles[i];
+                    lastIn[b] = triangles[i];
                     ++out[a];
                     ++in[b];
-                    edges[2 * *edgeCount] = a;
-                    edges[2 * *edgeCount + 1] = b;
+                    uint32_t* e = edges + 3 * *edgeCount;
+                    e[0] = a;
+                    e[1] = b;
+                    e[2] = triangles[i];
                     ++*edgeCount;
                 }
             }
         for (uint32_t v = 0; v < n; ++v)
         {
             bool inside = in[v] == 0 && out[v] == 0;
-            if (inside ? !(Abs(angleSum[v] - 2 * kPi) < 1) : (in[v] != 1 || out[v] != 1 || !(angleSum[v] < 2 * kPi - 1e-6)))
-                return false;
+            if (inside ? Abs(angleSum[v] - 2 * kPi) < 1 : (in[v] == 1 && out[v] == 1 && angleSum[v] < 2 * kPi - 1e-6))
+                continue;
+            // Pinched: two of its fans; wrapped: the two triangles on either side of the opening.
+            if (!inside)
+                *seeds = {firstOut[v], out[v] > 1 ? lastOut[v] : lastIn[v]};
+            return false;
         }
         return true;
     }
@@ -143,7 +155,7 @@ namespace
 
     // Compares the boundary edges that share a grid cell; each pair only in the cell of the lower
     // left corner of their (widened) boxes' overlap.
-    bool BoundarySimple(const FlatChart& flat, const uint32_t* edges, uint32_t count)
+    bool BoundarySimple(const FlatChart& flat, const uint32_t* edges, uint32_t count, SplitSeeds* seeds)
     {
         if (count < 3)
             return true;
@@ -173,7 +185,7 @@ namespace
             for (uint32_t e = 0; e < count; ++e)
             {
                 uint32_t x0, y0, x1, y1;
-                grid.Range(UV(flat, edges[2 * e]), UV(flat, edges[2 * e + 1]), &x0, &y0, &x1, &y1);
+                grid.Range(UV(flat, edges[3 * e]), UV(flat, edges[3 * e + 1]), &x0, &y0, &x1, &y1);
                 for (uint32_t y = y0; y <= y1; ++y)
                     for (uint32_t x = x0; x <= x1; ++x)
                     {
@@ -200,8 +212,8 @@ namespace
             for (uint32_t i = start[c]; i < start[c + 1]; ++i)
                 for (uint32_t j = i + 1; j < start[c + 1]; ++j)
                 {
-                    const uint32_t* e = edges + 2 * members[i];
-                    const uint32_t* f = edges + 2 * members[j];
+                    const uint32_t* e = edges + 3 * members[i];
+                    const uint32_t* f = edges + 3 * members[j];
                     if (e[0] == f[0] || e[0] == f[1] || e[1] == f[0] || e[1] == f[1])
                         continue;   // edges that follow each other: the fan check covers them
                     Point p = UV(flat, e[0]), q = UV(flat, e[1]), r = UV(flat, f[0]), s = UV(flat, f[1]);
@@ -209,8 +221,10 @@ namespace
                     double lowY = (p.y < q.y ? p.y : q.y) > (r.y < s.y ? r.y : s.y) ? (p.y < q.y ? p.y : q.y) : (r.y < s.y ? r.y : s.y);
                     if ((uint64_t)grid.Cell(lowY - grid.tolerance, minY) * side + grid.Cell(lowX - grid.tolerance, minX) != c)
                         continue;
-                    if (comparisons-- == 0 || TooClose(p, q, r, s, grid.tolerance))
+                    if (comparisons-- == 0)
                         return false;
+                    if (TooClose(p, q, r, s, grid.tolerance))
+                        return (*seeds = {e[2], f[2]}), false;
                 }
         return true;
     }
@@ -219,14 +233,16 @@ namespace
 
 
 bool ChartIsValid(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t chart, const uint32_t* triangles, uint32_t count,
-                  const FlatChart& flat, const DistortionLimits& limits, ChartMeasure* measure)
+                  const FlatChart& flat, const DistortionLimits& limits, ChartMeasure* measure, SplitSeeds* seeds)
 {
     *measure = {0, 0};
+    *seeds = {kNoChart, kNoChart};
     if (!AllFinite(flat) || !WithinDistortion(mesh, triangles, count, flat, limits, measure))
         return false;
     Scratch<uint32_t> edges;
     uint32_t edgeCount = 0;
-    if (!edges.Allocate(6ull * count) || !FansClosed(mesh, chartOf, chart, triangles, count, flat, edges.Data(), &edgeCount))
+    if (!edges.Allocate(9ull * count) ||
+        !FansClosed(mesh, chartOf, chart, triangles, count, flat, edges.Data(), &edgeCount, seeds))
         return false;
-    return BoundarySimple(flat, edges.Data(), edgeCount);
+    return BoundarySimple(flat, edges.Data(), edgeCount, seeds);
 }

@@ -32,8 +32,16 @@ struct ChartMeasure
     double angleDistortion, areaDistortion;
 };
 
+// Where to split a chart that failed at one place: two of its triangles on either side of the
+// trouble (a wrapped or pinched vertex, two boundary edges too close), kNoChart when the failure
+// has no place (distortion).
+struct SplitSeeds
+{
+    uint32_t a, b;
+};
+
 // chartOf[t] == chart for the chart's triangles (boundary edges are those whose twin is elsewhere).
 // False when the chart fails a check or scratch memory runs out. *measure is filled when the
-// chart gets as far as the distortion checks.
+// chart gets as far as the distortion checks, *seeds on a failure with a place.
 bool ChartIsValid(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t chart, const uint32_t* triangles, uint32_t count,
-                  const FlatChart& flat, const DistortionLimits& limits, ChartMeasure* measure);
+                  const FlatChart& flat, const DistortionLimits& limits, ChartMeasure* measure, SplitSeeds* seeds);

@@ -23,7 +23,7 @@ namespace
         }
     }
 
-    // Angle defects at interior vertices, spread over the triangles by corner angle.
+    // Angle defects (signed) at interior vertices, spread over the triangles by corner angle.
     bool MeasureCurvature(const ChartMesh& mesh, double* curvature)
     {
         Scratch<double> angleSum;
@@ -39,7 +39,7 @@ namespace
                 continue;
             if (mesh.twin[h] == kNoTwin)
                 open[mesh.tri[h]] = open[mesh.tri[NextCorner(h)]] = 1;
-            angleSum[mesh.tri[h]] += CornerAngle3(mesh, t, h % 3);
+            angleSum[mesh.tri[h]] += mesh.cornerAngle[h];
         }
         for (uint32_t t = 0; t < mesh.triCount; ++t)
         {
@@ -48,9 +48,30 @@ namespace
             {
                 uint32_t v = mesh.tri[3 * t + c];
                 if (!open[v] && angleSum[v] > 0)
-                    curvature[t] += Abs(2 * kPi - angleSum[v]) * CornerAngle3(mesh, t, c) / angleSum[v];
+                    curvature[t] += (2 * kPi - angleSum[v]) * mesh.cornerAngle[3 * t + c] / angleSum[v];
             }
         }
+        return true;
+    }
+}
+
+namespace
+{
+    // Counting sort of the non-degenerate triangles' corners by vertex.
+    bool ListTrianglesAroundVertices(const ChartMesh& mesh, uint32_t* start, uint32_t* around)
+    {
+        memset(start, 0, (mesh.vertexCount + 1ull) * sizeof(uint32_t));
+        for (uint32_t i = 0; i < 3 * mesh.triCount; ++i)
+            if (!mesh.degenerate[i / 3])
+                ++start[mesh.tri[i] + 1];
+        for (uint32_t v = 0; v < mesh.vertexCount; ++v)
+            start[v + 1] += start[v];
+        for (uint32_t i = 0; i < 3 * mesh.triCount; ++i)
+            if (!mesh.degenerate[i / 3])
+                around[start[mesh.tri[i]]++] = i / 3;
+        for (uint32_t v = mesh.vertexCount; v > 0; --v)
+            start[v] = start[v - 1];
+        start[0] = 0;
         return true;
     }
 }
@@ -65,13 +86,19 @@ bool PrepareMesh(const float* vertex, uint32_t vertexCount, const uint32_t* tri,
         tri = out->welded.Data();
     }
     if (!out->twin.Allocate(3ull * triCount) || !out->normal.Allocate(triCount) || !out->area.Allocate(triCount) ||
-        !out->curvature.Allocate(triCount) || !out->degenerate.Allocate(triCount))
+        !out->curvature.Allocate(triCount) || !out->degenerate.Allocate(triCount) ||
+        !out->aroundStart.Allocate(vertexCount + 1ull) || !out->around.Allocate(3ull * triCount + 1) ||
+        !out->cornerAngle.Allocate(3ull * triCount))
         return false;
     MeasureTriangles(vertex, tri, triCount, out->normal.Data(), out->area.Data(), out->degenerate.Data());
     if (!FindTwins(tri, triCount, vertexCount, out->twin.Data()))
         return false;
     out->mesh = {vertex,          vertexCount,          tri,       triCount, out->normal.Data(), out->area.Data(),
-                 out->curvature.Data(), out->degenerate.Data(), out->twin.Data(), srcPoly};
+                 out->curvature.Data(), out->degenerate.Data(), out->twin.Data(), srcPoly, out->aroundStart.Data(),
+                 out->around.Data(), out->cornerAngle.Data()};
+    for (uint32_t h = 0; h < 3 * triCount; ++h)
+        out->cornerAngle[h] = out->degenerate[h / 3] ? 0.0f : (float)CornerAngle3(out->mesh, h / 3, h % 3);
+    ListTrianglesAroundVertices(out->mesh, out->aroundStart.Data(), out->around.Data());
     double hardAngle = param.hardAngle * (kPi / 180);
     CutSeams(out->mesh, cos(hardAngle), out->twin.Data());
     return MeasureCurvature(out->mesh, out->curvature.Data());

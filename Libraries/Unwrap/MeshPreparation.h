@@ -8,10 +8,13 @@
 //   - edge twins (MeshAdjacency): edges shared by more than two triangles or with opposite winding
 //     are seams; so is every edge whose two triangles' normals are more than hardAngle apart,
 //     unless both triangles come from one source polygon (srcPoly), which must stay in one piece;
-//   - curvature[t]: the triangle's share of the absolute angle defect |2 pi - angle sum| of its
-//     corners' vertices, split by corner angle, counted only at vertices all of whose edges are
-//     linked (interior vertices of the cut surface). A chart's sum of it bounds how far from
-//     developable the chart is, which is what conformal flattening turns into area distortion.
+//   - curvature[t]: the triangle's share of the angle defect 2 pi - angle sum (Gaussian
+//     curvature, signed) of its corners' vertices, split by corner angle, counted only at vertices
+//     all of whose edges are linked (interior vertices of the cut surface). A chart's sum of it
+//     tells how far from developable the chart is, which conformal flattening turns into area
+//     distortion; signed, so that the noise of scanned surfaces cancels out as it does in the map;
+//   - each vertex's non-degenerate triangles and every corner's angle (for the growing's tests at
+//     vertices).
 // Cost: linear in vertices + triangles; about 70 bytes a triangle.
 #pragma once
 
@@ -21,7 +24,8 @@
 
 struct PreparedMesh
 {
-    Scratch<uint32_t> welded, twin;
+    Scratch<uint32_t> welded, twin, aroundStart, around;
+    Scratch<float> cornerAngle;
     Scratch<Vec3> normal;
     Scratch<double> area, curvature;
     Scratch<uint8_t> degenerate;
