@@ -135,7 +135,7 @@ namespace
                 a = Farthest(r, m_Members[r.begin]);
                 b = Farthest(r, a);
             }
-            const GrowRules open = {-2, 1e300, 0, false, true};
+            const GrowRules open = {-2, 1e300, 0xFFFFFFFFu, 0, false, true};
             uint32_t firstNew = m_NextChart;
             m_Grower.Seed(a, r.chart, open);
             if (b != a)

@@ -82,6 +82,8 @@ bool ChartGrower::Admissible(uint32_t f, uint32_t c, const GrowRules& rules) con
     if (BreaksAtCorner(f, c))
         return false;
     const ChartProxy& proxy = m_Proxy[c];
+    if (proxy.triangles >= rules.maxTriangles)
+        return false;
     if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], Normalized(proxy.normalSum)) >= rules.cosNormalLimit))
         return false;
     return Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit;
@@ -96,6 +98,7 @@ void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rule
         proxy.normalSum = proxy.normalSum + m_Mesh->normal[f] * m_Mesh->area[f];
     proxy.curvature += m_Mesh->curvature[f];
     proxy.area += m_Mesh->area[f];
+    ++proxy.triangles;
 }
 
 void ChartGrower::PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules)
@@ -125,6 +128,7 @@ void ChartGrower::Seed(uint32_t seed, uint32_t chart, const GrowRules& rules)
     if (!rules.fixedProxies)
         proxy.normalSum = {0, 0, 0};
     proxy.curvature = proxy.area = 0;
+    proxy.triangles = 0;
     Add(seed, chart, 0, rules);
     PushNeighbours(seed, chart, rules);
 }

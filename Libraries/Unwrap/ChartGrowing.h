@@ -27,6 +27,7 @@ struct GrowRules
 {
     double cosNormalLimit;   // below -1: no limit
     double curvatureLimit;   // radians of total angle defect (either sign) a chart may hold
+    uint32_t maxTriangles;   // no chart grows beyond this (bounds the cost of flattening one chart)
     double compactness;
     bool fixedProxies;
     bool geodesic;   // cost: distance from the seed across triangle centroids instead (even splits)
@@ -37,6 +38,7 @@ struct ChartProxy
     Vec3 normalSum;   // sum of area * normal over the chart's triangles (or fixed for a round)
     double curvature;
     double area;
+    uint32_t triangles;
 };
 
 class ChartGrower

@@ -55,7 +55,7 @@ namespace
     void SumProxies(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t charts, ChartProxy* proxy)
     {
         for (uint32_t c = 0; c < charts; ++c)
-            proxy[c] = {{0, 0, 0}, 0, 0};
+            proxy[c] = {{0, 0, 0}, 0, 0, 0};
         for (uint32_t t = 0; t < mesh.triCount; ++t)
             if (chartOf[t] != kNoChart)
             {
@@ -63,6 +63,7 @@ namespace
                 p.normalSum = p.normalSum + mesh.normal[t] * mesh.area[t];
                 p.curvature += mesh.curvature[t];
                 p.area += mesh.area[t];
+                ++p.triangles;
             }
     }
 
@@ -193,7 +194,8 @@ namespace
                 Vec3 axis = Normalized(proxy[a].normalSum + proxy[b].normalSum);
                 bool fits = AngleBetweenUnit(axis, cone[a].axis) + cone[a].halfAngle <= angleLimit &&
                             AngleBetweenUnit(axis, cone[b].axis) + cone[b].halfAngle <= angleLimit &&
-                            Abs(proxy[a].curvature + proxy[b].curvature) <= rules.curvatureLimit;
+                            Abs(proxy[a].curvature + proxy[b].curvature) <= rules.curvatureLimit &&
+                            proxy[a].triangles + proxy[b].triangles <= rules.maxTriangles;
                 if (fits)
                 {
                     best = b;

@@ -11,6 +11,9 @@ namespace
 {
     const char* const kOutOfMemory = "out of memory";
     const double kPi = 3.14159265358979323846;
+    // Flattening a chart costs about n^1.5 for n triangles: beyond this size, more charts are
+    // cheaper than larger ones (meshes of a million triangles still make a few dozen charts).
+    const uint32_t kMaxChartTriangles = 40000;
 
     // Growing rules from the parameters. The normal limit keeps a chart within a cone around its
     // mean normal (a chart can still curve, as a cylinder strip does). The curvature budget turns
@@ -21,7 +24,7 @@ namespace
     GrowRules RulesFrom(const UnwrapParam& param)
     {
         double area = param.areaDistortionThreshold > 0 ? param.areaDistortionThreshold : 0;
-        return {cos(70 * kPi / 180), 8 * area, 0.25, false, false};
+        return {cos(70 * kPi / 180), 8 * area, kMaxChartTriangles, 0.25, false, false};
     }
 }
 
