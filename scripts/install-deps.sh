@@ -3,7 +3,7 @@
 # Safe to run repeatedly: it only calls apt-get when something is missing.
 set -euo pipefail
 
-packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm)
+packages=(build-essential cmake ninja-build pkg-config libunittest++-dev libgmp-dev clang lld llvm)
 
 missing=()
 for p in "${packages[@]}"; do
