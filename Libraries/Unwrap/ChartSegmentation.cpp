@@ -250,7 +250,10 @@ uint32_t SegmentCharts(const ChartMesh& mesh, const GrowRules& rules, uint32_t l
     Scratch<Cone> cone;
     Scratch<ChartProxy> proxy;
     Scratch<uint32_t> first;
-    if (!borders.Allocate(3ull * T + 1) || !sorted.Allocate(3ull * T + 1) || !cone.Allocate(charts + 1ull) || !proxy.Allocate(charts + 1ull) ||
+    uint64_t crossing = 1;   // linked half-edges between two charts: merging only ever lowers their number
+    for (uint32_t h = 0; h < 3 * T; ++h)
+        crossing += mesh.twin[h] != kNoTwin && chartOf[h / 3] != chartOf[mesh.twin[h] / 3];
+    if (!borders.Allocate(crossing) || !sorted.Allocate(crossing) || !cone.Allocate(charts + 1ull) || !proxy.Allocate(charts + 1ull) ||
         !first.Allocate(charts + 2ull))
         return kNoChart;
     for (int pass = 0; pass < 8; ++pass)
