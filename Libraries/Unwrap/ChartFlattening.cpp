@@ -190,24 +190,10 @@ namespace
     }
 
     // Gives every degenerate triangle a chart and UVs; returns the next free chart number.
-    uint32_t PlaceDegenerate(const ChartMesh& mesh, uint32_t* chartOf, float* outUV, uint32_t nextChart, bool* ok)
+    uint32_t PlaceDegenerate(const ChartMesh& mesh, uint32_t* chartOf, float* outUV, uint32_t nextChart)
     {
-        Scratch<uint32_t> start, around;
-        *ok = start.Allocate(mesh.vertexCount + 1ull) && around.Allocate(3ull * mesh.triCount + 1);
-        if (!*ok)
-            return nextChart;
-        memset(start.Data(), 0, (mesh.vertexCount + 1ull) * sizeof(uint32_t));
-        for (uint32_t i = 0; i < 3 * mesh.triCount; ++i)
-            if (!mesh.degenerate[i / 3])
-                ++start[mesh.tri[i] + 1];
-        for (uint32_t v = 0; v < mesh.vertexCount; ++v)
-            start[v + 1] += start[v];
-        for (uint32_t i = 0; i < 3 * mesh.triCount; ++i)
-            if (!mesh.degenerate[i / 3])
-                around[start[mesh.tri[i]]++] = i / 3;
-        for (uint32_t v = mesh.vertexCount; v > 0; --v)
-            start[v] = start[v - 1];
-        start[0] = 0;
+        const uint32_t* start = mesh.aroundStart;
+        const uint32_t* around = mesh.around;
         for (uint32_t t = 0; t < mesh.triCount; ++t)
         {
             if (!mesh.degenerate[t])
@@ -220,7 +206,7 @@ namespace
                 uint32_t c = chartOf[around[i]];
                 bool all = true;
                 for (uint32_t k = 0; k < 3 && all; ++k)
-                    all = UVInChart(mesh, chartOf, outUV, start.Data(), around.Data(), v[k], c, uv + 2 * k);
+                    all = UVInChart(mesh, chartOf, outUV, start, around, v[k], c, uv + 2 * k);
                 chartOf[t] = all ? c : kNoChart;
             }
             if (chartOf[t] != kNoChart)
@@ -241,7 +227,5 @@ uint32_t FlattenCharts(const ChartMesh& mesh, const DistortionLimits& limits, ui
     flattener.Start(chartCount);
     if (!flattener.Run(stats))
         return kNoChart;
-    bool ok = false;
-    uint32_t charts = PlaceDegenerate(mesh, chartOf, outUV, flattener.NextChart(), &ok);
-    return ok ? charts : kNoChart;
+    return PlaceDegenerate(mesh, chartOf, outUV, flattener.NextChart());
 }

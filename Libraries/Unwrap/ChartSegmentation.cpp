@@ -99,6 +99,24 @@ namespace
         double length;
     };
 
+    // order[] = the charts by area, smallest first, then by number (shell sort: charts may be many).
+    void SmallestFirst(const ChartProxy* proxy, uint32_t charts, uint32_t* order)
+    {
+        for (uint32_t c = 0; c < charts; ++c)
+            order[c] = c;
+        auto smaller = [proxy](uint32_t x, uint32_t y) {
+            return proxy[x].area != proxy[y].area ? proxy[x].area < proxy[y].area : x < y;
+        };
+        for (uint32_t gap = charts / 2; gap > 0; gap = gap == 2 ? 1 : gap * 5 / 11)
+            for (uint32_t i = gap; i < charts; ++i)
+            {
+                uint32_t x = order[i], j = i;
+                for (; j >= gap && smaller(x, order[j - gap]); j -= gap)
+                    order[j] = order[j - gap];
+                order[j] = x;
+            }
+    }
+
     // Fills borders[] with one entry per pair of neighbouring charts (a, b), a != b, both
     // directions, with the total length of linked edges between them, grouped by a and sorted by b
     // (two counting sorts); first[a] .. first[a + 1] are a's entries. Returns the number of entries.
@@ -158,20 +176,7 @@ namespace
                 k.halfAngle = angle > k.halfAngle ? angle : k.halfAngle;
             }
         CollectBorders(mesh, chartOf, charts, borders, sorted, first);
-        // Smallest charts first (shell sort by area, then chart number: charts may be many).
-        for (uint32_t c = 0; c < charts; ++c)
-            order[c] = c;
-        auto smaller = [proxy](uint32_t x, uint32_t y) {
-            return proxy[x].area != proxy[y].area ? proxy[x].area < proxy[y].area : x < y;
-        };
-        for (uint32_t gap = charts / 2; gap > 0; gap = gap == 2 ? 1 : gap * 5 / 11)
-            for (uint32_t i = gap; i < charts; ++i)
-            {
-                uint32_t x = order[i], j = i;
-                for (; j >= gap && smaller(x, order[j - gap]); j -= gap)
-                    order[j] = order[j - gap];
-                order[j] = x;
-            }
+        SmallestFirst(proxy, charts, order);
         for (uint32_t c = 0; c < charts; ++c)
             target[c] = kNoChart;   // kNoChart: untouched this pass; c: kept; other: merged into it
         uint32_t merges = 0;

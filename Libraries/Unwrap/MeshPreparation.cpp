@@ -58,7 +58,7 @@ namespace
 namespace
 {
     // Counting sort of the non-degenerate triangles' corners by vertex.
-    bool ListTrianglesAroundVertices(const ChartMesh& mesh, uint32_t* start, uint32_t* around)
+    void ListTrianglesAroundVertices(const ChartMesh& mesh, uint32_t* start, uint32_t* around)
     {
         memset(start, 0, (mesh.vertexCount + 1ull) * sizeof(uint32_t));
         for (uint32_t i = 0; i < 3 * mesh.triCount; ++i)
@@ -72,7 +72,6 @@ namespace
         for (uint32_t v = mesh.vertexCount; v > 0; --v)
             start[v] = start[v - 1];
         start[0] = 0;
-        return true;
     }
 }
 
