@@ -135,13 +135,22 @@ namespace
                 a = Farthest(r, m_Members[r.begin]);
                 b = Farthest(r, a);
             }
-            const GrowRules open = {-2, 1e300, 0xFFFFFFFFu, 0, false, true};
+            // Source polygons stay whole unless the chart is one polygon that failed: then the
+            // split ignores them, so that splitting always makes progress.
             uint32_t firstNew = m_NextChart;
-            m_Grower.Seed(a, r.chart, open);
-            if (b != a)
-                m_Grower.Seed(b, m_NextChart++, open);
-            m_Grower.Grow(open);
-            m_Grower.GrowRemaining(m_Members.Data() + r.begin, r.end - r.begin, open, &m_NextChart);
+            GrowRules open = {-2, 1e300, 0xFFFFFFFFu, 0, false, true, true};
+            for (;; open.keepPolygons = false)
+            {
+                m_Grower.Seed(a, r.chart, open);
+                if (b != a && m_ChartOf[b] == kNoChart)
+                    m_Grower.Seed(b, m_NextChart++, open);
+                m_Grower.Grow(open);
+                m_Grower.GrowRemaining(m_Members.Data() + r.begin, r.end - r.begin, open, &m_NextChart);
+                if (m_NextChart > firstNew || !open.keepPolygons)
+                    break;
+                for (uint32_t i = r.begin; i < r.end; ++i)
+                    m_ChartOf[m_Members[i]] = kNoChart;
+            }
             // Regroup the range part by part (counting sort on the part's slot) and queue the parts.
             uint32_t parts = m_NextChart - firstNew + 1;
             uint32_t* start = m_Slot.Data();

@@ -21,7 +21,7 @@ bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
 {
     m_Mesh = &mesh;
     m_ChartOf = chartOf;
-    if (!m_Heap.Allocate(4ull * mesh.triCount + 16) || !m_Proxy.Allocate(mesh.triCount + 1ull) || !m_Distance.Allocate(mesh.triCount + 1ull) ||
+    if (!m_Heap.Allocate(4ull * mesh.triCount + 16) || !m_Proxy.Allocate(mesh.triCount + 1ull) || !m_Distance.Allocate(mesh.triCount + 1ull) || !m_Polygon.Allocate(mesh.triCount + 1ull) ||
         !m_Rejected.Allocate(mesh.triCount + 1ull) || !m_Queued.Allocate(mesh.triCount + 1ull))
         return false;
     memset(m_Queued.Data(), 0, mesh.triCount);
@@ -101,6 +101,32 @@ void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rule
     ++proxy.triangles;
 }
 
+// Adds f and, when polygons are kept whole, every triangle of f's source polygon reachable from
+// it across linked edges inside the polygon; queues the neighbours of all of them.
+void ChartGrower::Join(uint32_t f, uint32_t c, double cost, const GrowRules& rules)
+{
+    const ChartMesh& mesh = *m_Mesh;
+    Add(f, c, cost, rules);
+    uint32_t top = 0;
+    m_Polygon[top++] = f;
+    while (top)
+    {
+        uint32_t t = m_Polygon[--top];
+        PushNeighbours(t, c, rules);
+        if (!rules.keepPolygons || !mesh.srcPoly)
+            continue;
+        for (uint32_t h = 3 * t; h < 3 * t + 3; ++h)
+        {
+            uint32_t w = mesh.twin[h] / 3;
+            if (mesh.twin[h] != kNoTwin && m_ChartOf[w] == kNoChart && mesh.srcPoly[w] == mesh.srcPoly[t])
+            {
+                Add(w, c, cost, rules);
+                m_Polygon[top++] = w;
+            }
+        }
+    }
+}
+
 void ChartGrower::PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules)
 {
     for (uint32_t h = 3 * t; h < 3 * t + 3; ++h)
@@ -129,8 +155,7 @@ void ChartGrower::Seed(uint32_t seed, uint32_t chart, const GrowRules& rules)
         proxy.normalSum = {0, 0, 0};
     proxy.curvature = proxy.area = 0;
     proxy.triangles = 0;
-    Add(seed, chart, 0, rules);
-    PushNeighbours(seed, chart, rules);
+    Join(seed, chart, 0, rules);
 }
 
 void ChartGrower::Grow(const GrowRules& rules)
@@ -146,8 +171,7 @@ void ChartGrower::Grow(const GrowRules& rules)
             Reject(f);
             continue;
         }
-        Add(f, entry.chart, entry.cost, rules);
-        PushNeighbours(f, entry.chart, rules);
+        Join(f, entry.chart, entry.cost, rules);
     }
 }
 

@@ -15,7 +15,9 @@
 // flattening survives either.
 // Proxies either follow each chart as it grows, or stay fixed for a round (Lloyd iteration).
 // For splitting, the cost can instead be the distance from the chart's seed (through triangle
-// centroids), so that two seeds share a chart evenly, as Voronoi regions do.
+// centroids), so that two seeds share a chart evenly, as Voronoi regions do. Source polygons
+// (srcPoly) join a chart whole: when one of their triangles joins, the rest of the polygon joins
+// with it, whatever the limits say.
 // Every order is decided by costs, then triangle numbers: runs are reproducible bit for bit.
 // Cost: O(n log n) for n triangles grown; memory 16 bytes a pushed candidate (at most 4 a triangle).
 #pragma once
@@ -31,6 +33,7 @@ struct GrowRules
     double compactness;
     bool fixedProxies;
     bool geodesic;   // cost: distance from the seed across triangle centroids instead (even splits)
+    bool keepPolygons;   // a triangle brings the rest of its source polygon (srcPoly) along
 };
 
 struct ChartProxy
@@ -65,6 +68,7 @@ public:
 private:
     double Cost(uint32_t f, uint32_t c, const GrowRules& rules) const;
     void PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules);
+    void Join(uint32_t f, uint32_t c, double cost, const GrowRules& rules);
     void Reject(uint32_t f);
     bool Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const;
     bool BreaksAtCorner(uint32_t f, uint32_t c) const;
@@ -75,6 +79,7 @@ private:
     MinHeap m_Heap;
     Scratch<ChartProxy> m_Proxy;
     Scratch<double> m_Distance;     // geodesic rules: each grown triangle's distance from its seed
+    Scratch<uint32_t> m_Polygon;    // stack of the triangles joining with a source polygon
     Scratch<uint32_t> m_Rejected;   // FIFO of triangles some chart turned down
     Scratch<uint8_t> m_Queued;      // 1 once a triangle is in m_Rejected
     uint32_t m_RejectedHead = 0, m_RejectedTail = 0;

@@ -24,7 +24,7 @@ namespace
     GrowRules RulesFrom(const UnwrapParam& param)
     {
         double area = param.areaDistortionThreshold > 0 ? param.areaDistortionThreshold : 0;
-        return {cos(75 * kPi / 180), 10 * area, kMaxChartTriangles, 0.25, false, false};
+        return {cos(75 * kPi / 180), 10 * area, kMaxChartTriangles, 0.25, false, false, true};
     }
 }
 

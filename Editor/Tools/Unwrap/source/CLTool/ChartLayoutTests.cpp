@@ -461,6 +461,25 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
         CHECK_EQUAL("", BrokenPromise(onePolygon, 1.0 / 256, false));
     }
 
+    TEST_FIXTURE(ChartsFixture, SourcePolygon_QuadsOfACurvedSurfaceAreNeverCutBetweenCharts)
+    {
+        // A sphere needs many charts; each quad of its bands is one source polygon of two
+        // triangles, and chart borders must run between quads, never along a quad's diagonal.
+        Mesh sphere = Sphere(32, 16);
+        uint32_t poles = 2 * 32;
+        std::vector<uint32_t> srcPoly(sphere.TriCount());
+        for (uint32_t t = 0; t < sphere.TriCount(); ++t)
+            srcPoly[t] = t < poles ? t : poles + (t - poles) / 2;
+        Params params;
+        params.areaDistortion = 0.05f;   // small charts: many borders
+        Layout layout = Unwrap(sphere, params, srcPoly);
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, false));
+        std::vector<uint32_t> charts = Charts(layout);
+        CHECK(ChartCount(charts) > 4);
+        for (uint32_t t = poles; t + 1 < sphere.TriCount(); t += 2)
+            CHECK_EQUAL(charts[t], charts[t + 1]);
+    }
+
     TEST_FIXTURE(ChartsFixture, RecollectVertices_WeldsSplitVerticesIntoOneChart)
     {
         // A square whose two triangles have their own copies of the diagonal's vertices.
