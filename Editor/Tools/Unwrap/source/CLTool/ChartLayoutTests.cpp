@@ -614,6 +614,22 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
         CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, true));
     }
 
+    TEST_FIXTURE(ChartsFixture, Sliver_ThinnerThanFloatUVsResolveStillUnwraps)
+    {
+        // A 200 x 200 grid and, on its border, a triangle 1e-7 high: at the layout's scale its
+        // height is far below the spacing of float UVs, so its UV area cannot keep a sign. The
+        // unwrap still succeeds and every other triangle keeps its orientation.
+        Mesh mesh = FlatGrid(200);
+        uint32_t tip = mesh.Add(0.5f, -1e-7f, 0);
+        mesh.Face(0, tip, 1);
+        Layout layout = Unwrap(mesh);
+        CHECK_EQUAL(mesh.tri.size() * 2, layout.uv.size());
+        uint32_t flipped = 0;
+        for (uint32_t t = 0; t + 1 < mesh.TriCount() && !layout.uv.empty(); ++t)
+            flipped += !(layout.UVArea(t) > 0);
+        CHECK_EQUAL(0u, flipped);
+    }
+
     TEST_FIXTURE(ChartsFixture, ManyCharts_PackedApartAtOneScale)
     {
         // 150 loose triangles of varied size and shape, in varied planes.
