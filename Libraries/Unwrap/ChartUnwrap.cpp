@@ -13,7 +13,7 @@ namespace
     const double kPi = 3.14159265358979323846;
     // Flattening a chart costs about n^1.5 for n triangles: beyond this size, more charts are
     // cheaper than larger ones (meshes of a million triangles still make a few dozen charts).
-    const uint32_t kMaxChartTriangles = 40000;
+    const uint32_t kMaxChartTriangles = 65536;
 
     // Growing rules from the parameters. The normal limit keeps a chart within a cone around its
     // mean normal (a chart can still curve, as a cylinder strip does). The curvature budget turns
