@@ -11,10 +11,6 @@ namespace
         return (Position(mesh.vertex, v[0]) + Position(mesh.vertex, v[1]) + Position(mesh.vertex, v[2])) * (1.0 / 3);
     }
 
-    double EdgeLength(const ChartMesh& mesh, uint32_t h)
-    {
-        return Length(Position(mesh.vertex, mesh.tri[NextCorner(h)]) - Position(mesh.vertex, mesh.tri[h]));
-    }
 }
 
 bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
@@ -34,12 +30,12 @@ double ChartGrower::Cost(uint32_t f, uint32_t c, const GrowRules& rules) const
     double perimeter = 0, shared = 0;
     for (uint32_t h = 3 * f; h < 3 * f + 3; ++h)
     {
-        double length = EdgeLength(mesh, h);
+        double length = mesh.edgeLength[h];
         perimeter += length;
         if (mesh.twin[h] != kNoTwin && m_ChartOf[mesh.twin[h] / 3] == c)
             shared += length;
     }
-    double deviation = 1 - Dot(mesh.normal[f], Normalized(m_Proxy[c].normalSum));
+    double deviation = 1 - Dot(mesh.normal[f], m_Proxy[c].normal);
     return deviation + rules.compactness * (perimeter > 0 ? (perimeter - 2 * shared) / perimeter : 0);
 }
 
@@ -84,7 +80,7 @@ bool ChartGrower::Admissible(uint32_t f, uint32_t c, const GrowRules& rules) con
     const ChartProxy& proxy = m_Proxy[c];
     if (proxy.triangles >= rules.maxTriangles)
         return false;
-    if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], Normalized(proxy.normalSum)) >= rules.cosNormalLimit))
+    if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], proxy.normal) >= rules.cosNormalLimit))
         return false;
     return Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit;
 }
@@ -95,7 +91,10 @@ void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rule
     m_ChartOf[f] = c;
     m_Distance[f] = cost;
     if (!rules.fixedProxies)
+    {
         proxy.normalSum = proxy.normalSum + m_Mesh->normal[f] * m_Mesh->area[f];
+        proxy.normal = Normalized(proxy.normalSum);
+    }
     proxy.curvature += m_Mesh->curvature[f];
     proxy.area += m_Mesh->area[f];
     ++proxy.triangles;
@@ -153,6 +152,7 @@ void ChartGrower::Seed(uint32_t seed, uint32_t chart, const GrowRules& rules)
     ChartProxy& proxy = m_Proxy[chart];
     if (!rules.fixedProxies)
         proxy.normalSum = {0, 0, 0};
+    proxy.normal = Normalized(proxy.normalSum);
     proxy.curvature = proxy.area = 0;
     proxy.triangles = 0;
     Join(seed, chart, 0, rules);

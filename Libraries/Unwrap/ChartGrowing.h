@@ -39,6 +39,7 @@ struct GrowRules
 struct ChartProxy
 {
     Vec3 normalSum;   // sum of area * normal over the chart's triangles (or fixed for a round)
+    Vec3 normal;      // normalSum made unit, kept up to date by the grower
     double curvature;
     double area;
     uint32_t triangles;

@@ -24,6 +24,7 @@ struct ChartMesh
     const uint32_t* aroundStart;   // vertex v's non-degenerate triangles: around[aroundStart[v] .. aroundStart[v + 1])
     const uint32_t* around;
     const float* cornerAngle;      // 3D angle at each corner (3 a triangle)
+    const float* edgeLength;       // 3D length of each half-edge
 };
 
 // Fills normal[], area[] and degenerate[] for every triangle. A triangle counts as degenerate when

@@ -55,7 +55,7 @@ namespace
     void SumProxies(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t charts, ChartProxy* proxy)
     {
         for (uint32_t c = 0; c < charts; ++c)
-            proxy[c] = {{0, 0, 0}, 0, 0, 0};
+            proxy[c] = {{0, 0, 0}, {0, 0, 0}, 0, 0, 0};
         for (uint32_t t = 0; t < mesh.triCount; ++t)
             if (chartOf[t] != kNoChart)
             {
@@ -129,8 +129,7 @@ namespace
             uint32_t a = chartOf[h / 3], b = mesh.twin[h] == kNoTwin ? kNoChart : chartOf[mesh.twin[h] / 3];
             if (a == kNoChart || b == kNoChart || a == b)
                 continue;
-            Vec3 d = Position(mesh.vertex, mesh.tri[NextCorner(h)]) - Position(mesh.vertex, mesh.tri[h]);
-            borders[n++] = {a, b, Length(d)};
+            borders[n++] = {a, b, mesh.edgeLength[h]};
         }
         for (int pass = 0; pass < 2; ++pass)   // by b, then stably by a
         {

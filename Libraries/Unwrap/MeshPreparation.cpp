@@ -87,16 +87,19 @@ bool PrepareMesh(const float* vertex, uint32_t vertexCount, const uint32_t* tri,
     if (!out->twin.Allocate(3ull * triCount) || !out->normal.Allocate(triCount) || !out->area.Allocate(triCount) ||
         !out->curvature.Allocate(triCount) || !out->degenerate.Allocate(triCount) ||
         !out->aroundStart.Allocate(vertexCount + 1ull) || !out->around.Allocate(3ull * triCount + 1) ||
-        !out->cornerAngle.Allocate(3ull * triCount))
+        !out->cornerAngle.Allocate(3ull * triCount) || !out->edgeLength.Allocate(3ull * triCount))
         return false;
     MeasureTriangles(vertex, tri, triCount, out->normal.Data(), out->area.Data(), out->degenerate.Data());
     if (!FindTwins(tri, triCount, vertexCount, out->twin.Data()))
         return false;
     out->mesh = {vertex,          vertexCount,          tri,       triCount, out->normal.Data(), out->area.Data(),
                  out->curvature.Data(), out->degenerate.Data(), out->twin.Data(), srcPoly, out->aroundStart.Data(),
-                 out->around.Data(), out->cornerAngle.Data()};
+                 out->around.Data(), out->cornerAngle.Data(), out->edgeLength.Data()};
     for (uint32_t h = 0; h < 3 * triCount; ++h)
+    {
         out->cornerAngle[h] = out->degenerate[h / 3] ? 0.0f : (float)CornerAngle3(out->mesh, h / 3, h % 3);
+        out->edgeLength[h] = (float)Length(Position(vertex, tri[NextCorner(h)]) - Position(vertex, tri[h]));
+    }
     ListTrianglesAroundVertices(out->mesh, out->aroundStart.Data(), out->around.Data());
     double hardAngle = param.hardAngle * (kPi / 180);
     CutSeams(out->mesh, cos(hardAngle), out->twin.Data());
