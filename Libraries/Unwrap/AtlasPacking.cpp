@@ -153,7 +153,9 @@ namespace
         // Tries the chart's orientations; places it at the best. Returns the orientation, or -1.
         int PlaceBest(uint32_t c, double scale, ChartPlace* place, bool* memoryOut)
         {
-            m_HoleBudget = kHoleSearchBudget;
+            m_HoleBudget = kHoleSearchTrialBudget / m_ChartCount;
+            m_HoleBudget = m_HoleBudget < kHoleSearchChartBudget[0] ? kHoleSearchChartBudget[0] : m_HoleBudget;
+            m_HoleBudget = m_HoleBudget > kHoleSearchChartBudget[1] ? kHoleSearchChartBudget[1] : m_HoleBudget;
             if (!m_SearchTurns)
                 return PlaceTurned(c, scale, (int)m_Turn[c], place, memoryOut);
             const uint32_t* members = m_Members + m_Start[c];

@@ -204,12 +204,9 @@ bool FindPlacement(AtlasOccupancy& atlas, const ChartRaster& chart, uint32_t top
     bool found = SkylineSearch(atlas, chart, &skyline) && skyline.y + chart.height < topLimit;
     if (found)
         *at = skyline, topLimit = skyline.y + chart.height;
-    if (chart.width <= kHoleSearchTexels && chart.height <= kHoleSearchTexels)
-    {
-        Placement hole;
-        if (HoleSearch(atlas, chart, topLimit, &hole, *holeBudget))
-            return (*at = hole), true;
-    }
+    Placement hole;
+    if (HoleSearch(atlas, chart, topLimit, &hole, *holeBudget))
+        return (*at = hole), true;
     return found;
 }
 

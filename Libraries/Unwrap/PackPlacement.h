@@ -1,5 +1,5 @@
 // Packing, step 2: where a chart's bitmap goes. The atlas is an occupancy bitmap `width`
-// texels wide (a multiple of 64) and `rows` high; a chart goes at an integer texel offset where
+// texels wide and `rows` high; a chart goes at an integer texel offset where
 // none of its texels is taken. The lowest top edge wins, then the leftmost position.
 //
 // Two searches, both exact about the texels they accept:
@@ -8,9 +8,9 @@
 //   unused). Positions are first compared on columns grouped by g (at most 64 groups a chart,
 //   256 an atlas: the group's highest skyline against its lowest chart texel, which can only
 //   overestimate), then the best group's g positions either side are worked out exactly.
-// - Holes, for charts up to kHoleSearchTexels a side: the bitmap below the skyline is searched
-//   bottom-left. Each atlas row keeps its longest free run, so rows that cannot hold the
-//   chart's runs are skipped unread; for runs up to 64 texels the lowest row that has one
+// - Holes: the bitmap below the skyline's best top is searched bottom-left, within a budget.
+//   Each atlas row keeps its longest free run, so rows that cannot hold the chart's runs are
+//   skipped unread; for runs up to 64 texels the lowest row that has one
 //   is remembered (rows only ever fill up); candidate offsets come from the free runs of the
 //   chart's widest row; a fit is tested 64 texels at a time.
 #pragma once
@@ -18,11 +18,11 @@
 #include "PackRaster.h"
 
 const uint32_t kNoTopLimit = 0xFFFFFFFFu;
-const uint32_t kHoleSearchTexels = 48;
-// Rows plus positions the hole searches for one chart examine at most (all its orientations
-// together): they are a refinement, and a crowded atlas could otherwise cost a test at every
-// free texel for every small chart.
-const int64_t kHoleSearchBudget = 1024;
+// Rows plus positions the hole searches of one trial examine at most, shared out among the
+// charts (all orientations of a chart together), within the per-chart bounds: holes are a
+// refinement, and a crowded atlas could otherwise cost a test at every free texel per chart.
+const int64_t kHoleSearchTrialBudget = 1 << 22;
+const int64_t kHoleSearchChartBudget[2] = {1024, 16384};
 
 struct AtlasOccupancy
 {
@@ -44,7 +44,7 @@ struct Placement
 
 // The best free position for `chart` whose top (y + height) lies below `topLimit`
 // (kNoTopLimit: anywhere in the atlas); false when there is none. The hole search spends
-// *holeBudget (see kHoleSearchBudget).
+// *holeBudget (see kHoleSearchTrialBudget).
 // Cost: skyline, (atlas width / g) x (chart width / g) + 2 g x chart width; holes, the rows
 // examined and the free runs of the candidate rows.
 bool FindPlacement(AtlasOccupancy& atlas, const ChartRaster& chart, uint32_t topLimit, Placement* at, int64_t* holeBudget);
