@@ -77,8 +77,9 @@ namespace
             chartOf[t] = kNoChart;
         GrowRules fixed = rules;
         fixed.fixedProxies = true;
-        for (uint32_t c = 0; c < charts; ++c)
-            grower.Seed(seedOf[c], c, fixed);
+        for (uint32_t c = 0; c < charts; ++c)   // a seed already taken with another's polygon leaves c empty
+            if (seedOf[c] != kNoChart && chartOf[seedOf[c]] == kNoChart)
+                grower.Seed(seedOf[c], c, fixed);
         grower.Grow(fixed);
         uint32_t next = charts;
         grower.GrowRemaining(nullptr, mesh.triCount, rules, &next);
