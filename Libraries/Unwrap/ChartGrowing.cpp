@@ -58,14 +58,13 @@ bool ChartGrower::BreaksAtCorner(uint32_t f, uint32_t c) const
         uint32_t inChart = 1, all = mesh.aroundStart[v + 1] - mesh.aroundStart[v];
         for (uint32_t i = mesh.aroundStart[v]; i < mesh.aroundStart[v + 1]; ++i)
         {
-            uint32_t t = mesh.around[i];
-            if (m_ChartOf[t] != c)
+            uint32_t corner = mesh.around[i];
+            if (m_ChartOf[corner / 3] != c)
                 continue;
             if (!linked)
                 return true;
             ++inChart;
-            for (uint32_t j = 0; j < 3; ++j)
-                angle += mesh.tri[3 * t + j] == v ? mesh.cornerAngle[3 * t + j] : 0;
+            angle += mesh.cornerAngle[corner];
         }
         if (angle > kFullTurn - kWrapMargin && inChart < all)
             return true;

@@ -57,7 +57,7 @@ namespace
 
 namespace
 {
-    // Counting sort of the non-degenerate triangles' corners by vertex.
+    // Counting sort of the non-degenerate triangles' corners (3t + c) by vertex.
     void ListTrianglesAroundVertices(const ChartMesh& mesh, uint32_t* start, uint32_t* around)
     {
         memset(start, 0, (mesh.vertexCount + 1ull) * sizeof(uint32_t));
@@ -68,7 +68,7 @@ namespace
             start[v + 1] += start[v];
         for (uint32_t i = 0; i < 3 * mesh.triCount; ++i)
             if (!mesh.degenerate[i / 3])
-                around[start[mesh.tri[i]]++] = i / 3;
+                around[start[mesh.tri[i]]++] = i;
         for (uint32_t v = mesh.vertexCount; v > 0; --v)
             start[v] = start[v - 1];
         start[0] = 0;

@@ -13,7 +13,7 @@
 //     all of whose edges are linked (interior vertices of the cut surface). A chart's sum of it
 //     tells how far from developable the chart is, which conformal flattening turns into area
 //     distortion; signed, so that the noise of scanned surfaces cancels out as it does in the map;
-//   - each vertex's non-degenerate triangles, every corner's angle and every edge's length (for
+//   - each vertex's corners in non-degenerate triangles, every corner's angle and every edge's length (for
 //     the growing's costs and its tests at vertices).
 // Cost: linear in vertices + triangles; about 70 bytes a triangle.
 #pragma once
