@@ -73,6 +73,8 @@ namespace
                 }
                 ++stats->splits;
                 Split(r, seeds);
+                if (m_Grower.Failed())
+                    return false;
             }
             stats->angleDistortion = area > 0 ? stats->angleDistortion / area : 0;
             stats->areaDistortion = area > 0 ? stats->areaDistortion / area : 0;

@@ -17,10 +17,30 @@ bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
 {
     m_Mesh = &mesh;
     m_ChartOf = chartOf;
-    if (!m_Heap.Allocate(4ull * mesh.triCount + 16) || !m_Proxy.Allocate(mesh.triCount + 1ull) || !m_Distance.Allocate(mesh.triCount + 1ull) || !m_Polygon.Allocate(mesh.triCount + 1ull) ||
-        !m_Rejected.Allocate(mesh.triCount + 1ull) || !m_Queued.Allocate(mesh.triCount + 1ull))
+    uint64_t T = mesh.triCount + 1ull;
+    if (!m_Heap.Allocate(3 * T + 16) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
+        !m_Rejected.Allocate(T) || !m_Queued.Allocate(T))
         return false;
     memset(m_Queued.Data(), 0, mesh.triCount);
+    return true;
+}
+
+bool ChartGrower::Reserve(uint32_t chart)
+{
+    if (chart < m_ProxyCapacity)
+        return true;
+    uint64_t capacity = m_ProxyCapacity ? 2ull * m_ProxyCapacity : 256;
+    capacity = capacity > chart ? capacity : chart + 1ull;
+    if (capacity * sizeof(ChartProxy) > 0xFFFFFFF0ull)
+        return false;
+    ChartProxy* grown = (ChartProxy*)Tessary_Allocate((unsigned int)(capacity * sizeof(ChartProxy)));
+    if (!grown)
+        return false;
+    if (m_ProxyCapacity)
+        memcpy(grown, m_Proxy, m_ProxyCapacity * sizeof(ChartProxy));
+    Tessary_Deallocate(m_Proxy);
+    m_Proxy = grown;
+    m_ProxyCapacity = (uint32_t)capacity;
     return true;
 }
 
@@ -134,7 +154,7 @@ void ChartGrower::PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules)
             continue;
         uint32_t w = twin / 3;
         double cost = rules.geodesic ? m_Distance[t] + Length(Centroid(*m_Mesh, w) - Centroid(*m_Mesh, t)) : Cost(w, c, rules);
-        m_Heap.Push({cost, w, c});   // room for 3 a triangle added, plus one a seed
+        m_Heap.Push({cost, w, c});   // room for 3 a triangle added: each joins once a growth
     }
 }
 
@@ -148,6 +168,11 @@ void ChartGrower::Reject(uint32_t f)
 
 void ChartGrower::Seed(uint32_t seed, uint32_t chart, const GrowRules& rules)
 {
+    if (!Reserve(chart))
+    {
+        m_Failed = true;
+        return;
+    }
     ChartProxy& proxy = m_Proxy[chart];
     if (!rules.fixedProxies)
         proxy.normalSum = {0, 0, 0};

@@ -251,6 +251,8 @@ uint32_t SegmentCharts(const ChartMesh& mesh, const GrowRules& rules, uint32_t l
     grower.GrowRemaining(nullptr, T, rules, &charts);
     for (uint32_t round = 0; round < lloydRounds; ++round)
         charts = LloydRound(mesh, rules, grower, charts, chartOf, seedOf.Data(), queue.Data(), depth.Data());
+    if (grower.Failed())
+        return kNoChart;
     Scratch<Border> borders, sorted;
     Scratch<Cone> cone;
     Scratch<ChartProxy> proxy;
