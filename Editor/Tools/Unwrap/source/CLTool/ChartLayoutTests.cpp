@@ -614,6 +614,25 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
         CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, true));
     }
 
+    TEST_FIXTURE(ChartsFixture, Report_CountsTheChartsThatFailedTheirChecksAndWereSplit)
+    {
+        // Under an angle threshold the sphere's grown charts cannot keep, flattening splits them:
+        // every split adds at least one chart, and what is accepted keeps the threshold.
+        Params tight;
+        tight.angleDistortion = 0.002f;
+        std::ofstream(dir + "/mesh.bin", std::ios::binary) << BinaryMesh(Sphere(32, 16), tight, {});
+        Testing::ChildResult r = Testing::RunProgram({std::string(CHARTBAKE_BIN_DIR) + "/ChartBake", "mesh.bin", "out.bin"}, dir,
+                                                     {"CHARTBAKE_LIBRARY_BEHAVIOUR=unwrap-report-stats"});
+        CHECK_EQUAL(0, r.exitStatus);
+        unsigned segmented = 0, splits = 0, charts = 0;
+        double angle = 1, area = 1;
+        CHECK_EQUAL(5, std::sscanf(r.out.c_str(), "segmented %u charts, %u splits, %u charts, angle distortion %lf, area distortion %lf",
+                                   &segmented, &splits, &charts, &angle, &area));
+        CHECK(splits > 0);
+        CHECK(charts >= segmented + splits);
+        CHECK(angle <= 0.002 && area <= 0.15);
+    }
+
     TEST_FIXTURE(ChartsFixture, Sliver_ThinnerThanFloatUVsResolveStillUnwraps)
     {
         // A 200 x 200 grid and, on its border, a triangle 1e-7 high: at the layout's scale its
