@@ -73,6 +73,8 @@ namespace
                 }
                 ++stats->splits;
                 Split(r, seeds);
+                if (m_Grower.Failed())
+                    return false;
             }
             stats->angleDistortion = area > 0 ? stats->angleDistortion / area : 0;
             stats->areaDistortion = area > 0 ? stats->areaDistortion / area : 0;
@@ -179,21 +181,17 @@ namespace
     };
 
     // The UV of vertex v in chart c, from a non-degenerate triangle of c around v; false if none.
-    bool UVInChart(const ChartMesh& mesh, const uint32_t* chartOf, const float* outUV, const uint32_t* start,
+    bool UVInChart(const uint32_t* chartOf, const float* outUV, const uint32_t* start,
                    const uint32_t* around, uint32_t v, uint32_t c, float* uv)
     {
         for (uint32_t i = start[v]; i < start[v + 1]; ++i)
         {
-            uint32_t t = around[i];
-            if (chartOf[t] != c)
+            uint32_t corner = around[i];
+            if (chartOf[corner / 3] != c)
                 continue;
-            for (uint32_t k = 0; k < 3; ++k)
-                if (mesh.tri[3 * t + k] == v)
-                {
-                    uv[0] = outUV[6ull * t + 2 * k];
-                    uv[1] = outUV[6ull * t + 2 * k + 1];
-                    return true;
-                }
+            uv[0] = outUV[2ull * corner];
+            uv[1] = outUV[2ull * corner + 1];
+            return true;
         }
         return false;
     }
@@ -212,10 +210,10 @@ namespace
             chartOf[t] = kNoChart;
             for (uint32_t i = start[v[0]]; i < start[v[0] + 1] && chartOf[t] == kNoChart; ++i)
             {
-                uint32_t c = chartOf[around[i]];
+                uint32_t c = chartOf[around[i] / 3];
                 bool all = true;
                 for (uint32_t k = 0; k < 3 && all; ++k)
-                    all = UVInChart(mesh, chartOf, outUV, start, around, v[k], c, uv + 2 * k);
+                    all = UVInChart(chartOf, outUV, start, around, v[k], c, uv + 2 * k);
                 chartOf[t] = all ? c : kNoChart;
             }
             if (chartOf[t] != kNoChart)

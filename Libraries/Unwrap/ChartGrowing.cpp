@@ -11,20 +11,36 @@ namespace
         return (Position(mesh.vertex, v[0]) + Position(mesh.vertex, v[1]) + Position(mesh.vertex, v[2])) * (1.0 / 3);
     }
 
-    double EdgeLength(const ChartMesh& mesh, uint32_t h)
-    {
-        return Length(Position(mesh.vertex, mesh.tri[NextCorner(h)]) - Position(mesh.vertex, mesh.tri[h]));
-    }
 }
 
 bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
 {
     m_Mesh = &mesh;
     m_ChartOf = chartOf;
-    if (!m_Heap.Allocate(4ull * mesh.triCount + 16) || !m_Proxy.Allocate(mesh.triCount + 1ull) || !m_Distance.Allocate(mesh.triCount + 1ull) || !m_Polygon.Allocate(mesh.triCount + 1ull) ||
-        !m_Rejected.Allocate(mesh.triCount + 1ull) || !m_Queued.Allocate(mesh.triCount + 1ull))
+    uint64_t T = mesh.triCount + 1ull;
+    if (!m_Heap.Allocate(3 * T + 16) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
+        !m_Rejected.Allocate(T) || !m_Queued.Allocate(T))
         return false;
     memset(m_Queued.Data(), 0, mesh.triCount);
+    return true;
+}
+
+bool ChartGrower::Reserve(uint32_t chart)
+{
+    if (chart < m_ProxyCapacity)
+        return true;
+    uint64_t capacity = m_ProxyCapacity ? 2ull * m_ProxyCapacity : 256;
+    capacity = capacity > chart ? capacity : chart + 1ull;
+    if (capacity * sizeof(ChartProxy) > 0xFFFFFFF0ull)
+        return false;
+    ChartProxy* grown = (ChartProxy*)Tessary_Allocate((unsigned int)(capacity * sizeof(ChartProxy)));
+    if (!grown)
+        return false;
+    if (m_ProxyCapacity)
+        memcpy(grown, m_Proxy, m_ProxyCapacity * sizeof(ChartProxy));
+    Tessary_Deallocate(m_Proxy);
+    m_Proxy = grown;
+    m_ProxyCapacity = (uint32_t)capacity;
     return true;
 }
 
@@ -34,12 +50,12 @@ double ChartGrower::Cost(uint32_t f, uint32_t c, const GrowRules& rules) const
     double perimeter = 0, shared = 0;
     for (uint32_t h = 3 * f; h < 3 * f + 3; ++h)
     {
-        double length = EdgeLength(mesh, h);
+        double length = mesh.edgeLength[h];
         perimeter += length;
         if (mesh.twin[h] != kNoTwin && m_ChartOf[mesh.twin[h] / 3] == c)
             shared += length;
     }
-    double deviation = 1 - Dot(mesh.normal[f], Normalized(m_Proxy[c].normalSum));
+    double deviation = 1 - Dot(mesh.normal[f], m_Proxy[c].normal);
     return deviation + rules.compactness * (perimeter > 0 ? (perimeter - 2 * shared) / perimeter : 0);
 }
 
@@ -62,14 +78,13 @@ bool ChartGrower::BreaksAtCorner(uint32_t f, uint32_t c) const
         uint32_t inChart = 1, all = mesh.aroundStart[v + 1] - mesh.aroundStart[v];
         for (uint32_t i = mesh.aroundStart[v]; i < mesh.aroundStart[v + 1]; ++i)
         {
-            uint32_t t = mesh.around[i];
-            if (m_ChartOf[t] != c)
+            uint32_t corner = mesh.around[i];
+            if (m_ChartOf[corner / 3] != c)
                 continue;
             if (!linked)
                 return true;
             ++inChart;
-            for (uint32_t j = 0; j < 3; ++j)
-                angle += mesh.tri[3 * t + j] == v ? mesh.cornerAngle[3 * t + j] : 0;
+            angle += mesh.cornerAngle[corner];
         }
         if (angle > kFullTurn - kWrapMargin && inChart < all)
             return true;
@@ -84,7 +99,7 @@ bool ChartGrower::Admissible(uint32_t f, uint32_t c, const GrowRules& rules) con
     const ChartProxy& proxy = m_Proxy[c];
     if (proxy.triangles >= rules.maxTriangles)
         return false;
-    if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], Normalized(proxy.normalSum)) >= rules.cosNormalLimit))
+    if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], proxy.normal) >= rules.cosNormalLimit))
         return false;
     return Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit;
 }
@@ -95,7 +110,10 @@ void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rule
     m_ChartOf[f] = c;
     m_Distance[f] = cost;
     if (!rules.fixedProxies)
+    {
         proxy.normalSum = proxy.normalSum + m_Mesh->normal[f] * m_Mesh->area[f];
+        proxy.normal = Normalized(proxy.normalSum);
+    }
     proxy.curvature += m_Mesh->curvature[f];
     proxy.area += m_Mesh->area[f];
     ++proxy.triangles;
@@ -136,7 +154,7 @@ void ChartGrower::PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules)
             continue;
         uint32_t w = twin / 3;
         double cost = rules.geodesic ? m_Distance[t] + Length(Centroid(*m_Mesh, w) - Centroid(*m_Mesh, t)) : Cost(w, c, rules);
-        m_Heap.Push({cost, w, c});   // room for 3 a triangle added, plus one a seed
+        m_Heap.Push({cost, w, c});   // room for 3 a triangle added: each joins once a growth
     }
 }
 
@@ -150,9 +168,15 @@ void ChartGrower::Reject(uint32_t f)
 
 void ChartGrower::Seed(uint32_t seed, uint32_t chart, const GrowRules& rules)
 {
+    if (!Reserve(chart))
+    {
+        m_Failed = true;
+        return;
+    }
     ChartProxy& proxy = m_Proxy[chart];
     if (!rules.fixedProxies)
         proxy.normalSum = {0, 0, 0};
+    proxy.normal = Normalized(proxy.normalSum);
     proxy.curvature = proxy.area = 0;
     proxy.triangles = 0;
     Join(seed, chart, 0, rules);

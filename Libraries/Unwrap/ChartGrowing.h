@@ -19,11 +19,13 @@
 // (srcPoly) join a chart whole: when one of their triangles joins, the rest of the polygon joins
 // with it, whatever the limits say.
 // Every order is decided by costs, then triangle numbers: runs are reproducible bit for bit.
-// Cost: O(n log n) for n triangles grown; memory 16 bytes a pushed candidate (at most 4 a triangle).
+// Cost: O(n log n) for n triangles grown; memory 16 bytes a pushed candidate (at most 3 a triangle
+// and 3 a seed), 72 bytes a chart.
 #pragma once
 
 #include "ChartMesh.h"
 #include "MinHeap.h"
+#include "../Tessary/TessaryApi.h"
 
 struct GrowRules
 {
@@ -39,6 +41,7 @@ struct GrowRules
 struct ChartProxy
 {
     Vec3 normalSum;   // sum of area * normal over the chart's triangles (or fixed for a round)
+    Vec3 normal;      // normalSum made unit, kept up to date by the grower
     double curvature;
     double area;
     uint32_t triangles;
@@ -47,10 +50,19 @@ struct ChartProxy
 class ChartGrower
 {
 public:
-    // chartOf has one entry a triangle; proxies room for one a triangle (charts are never more).
+    ChartGrower() = default;
+    ChartGrower(const ChartGrower&) = delete;
+    ChartGrower& operator=(const ChartGrower&) = delete;
+    ~ChartGrower() { Tessary_Deallocate(m_Proxy); }
+
+    // chartOf has one entry a triangle. Proxies grow with the chart numbers seeded.
     bool Allocate(const ChartMesh& mesh, uint32_t* chartOf);
 
-    ChartProxy* Proxies() { return m_Proxy.Data(); }
+    // Proxies of the charts seeded so far (numbers below the highest seeded + 1).
+    ChartProxy* Proxies() { return m_Proxy; }
+
+    // True once a proxy could not get memory: the growing since then is incomplete.
+    bool Failed() const { return m_Failed; }
 
     // Puts `seed` into chart `chart` (a fresh proxy from the seed unless the rules fix proxies, in
     // which case the proxy's normalSum is kept and its curvature and area restart from the seed).
@@ -77,7 +89,11 @@ private:
     const ChartMesh* m_Mesh = nullptr;
     uint32_t* m_ChartOf = nullptr;
     MinHeap m_Heap;
-    Scratch<ChartProxy> m_Proxy;
+    bool Reserve(uint32_t chart);
+
+    ChartProxy* m_Proxy = nullptr;   // on Tessary's allocator, doubled as chart numbers grow
+    uint32_t m_ProxyCapacity = 0;
+    bool m_Failed = false;
     Scratch<double> m_Distance;     // geodesic rules: each grown triangle's distance from its seed
     Scratch<uint32_t> m_Polygon;    // stack of the triangles joining with a source polygon
     Scratch<uint32_t> m_Rejected;   // FIFO of triangles some chart turned down

@@ -21,9 +21,10 @@ struct ChartMesh
     const uint8_t* degenerate;  // 1 for a triangle of (numerically) zero area
     const uint32_t* twin;       // 3 a triangle, kNoTwin where an edge links nothing or is a seam
     const uint32_t* srcPoly;    // source polygon of each triangle, or null
-    const uint32_t* aroundStart;   // vertex v's non-degenerate triangles: around[aroundStart[v] .. aroundStart[v + 1])
+    const uint32_t* aroundStart;   // vertex v's corners (3t + c) in non-degenerate triangles: around[aroundStart[v] .. aroundStart[v + 1])
     const uint32_t* around;
     const float* cornerAngle;      // 3D angle at each corner (3 a triangle)
+    const float* edgeLength;       // 3D length of each half-edge
 };
 
 // Fills normal[], area[] and degenerate[] for every triangle. A triangle counts as degenerate when

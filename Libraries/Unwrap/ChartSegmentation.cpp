@@ -55,7 +55,7 @@ namespace
     void SumProxies(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t charts, ChartProxy* proxy)
     {
         for (uint32_t c = 0; c < charts; ++c)
-            proxy[c] = {{0, 0, 0}, 0, 0, 0};
+            proxy[c] = {{0, 0, 0}, {0, 0, 0}, 0, 0, 0};
         for (uint32_t t = 0; t < mesh.triCount; ++t)
             if (chartOf[t] != kNoChart)
             {
@@ -77,8 +77,9 @@ namespace
             chartOf[t] = kNoChart;
         GrowRules fixed = rules;
         fixed.fixedProxies = true;
-        for (uint32_t c = 0; c < charts; ++c)
-            grower.Seed(seedOf[c], c, fixed);
+        for (uint32_t c = 0; c < charts; ++c)   // a seed already taken with another's polygon leaves c empty
+            if (seedOf[c] != kNoChart && chartOf[seedOf[c]] == kNoChart)
+                grower.Seed(seedOf[c], c, fixed);
         grower.Grow(fixed);
         uint32_t next = charts;
         grower.GrowRemaining(nullptr, mesh.triCount, rules, &next);
@@ -129,8 +130,7 @@ namespace
             uint32_t a = chartOf[h / 3], b = mesh.twin[h] == kNoTwin ? kNoChart : chartOf[mesh.twin[h] / 3];
             if (a == kNoChart || b == kNoChart || a == b)
                 continue;
-            Vec3 d = Position(mesh.vertex, mesh.tri[NextCorner(h)]) - Position(mesh.vertex, mesh.tri[h]);
-            borders[n++] = {a, b, Length(d)};
+            borders[n++] = {a, b, mesh.edgeLength[h]};
         }
         for (int pass = 0; pass < 2; ++pass)   // by b, then stably by a
         {
@@ -251,6 +251,8 @@ uint32_t SegmentCharts(const ChartMesh& mesh, const GrowRules& rules, uint32_t l
     grower.GrowRemaining(nullptr, T, rules, &charts);
     for (uint32_t round = 0; round < lloydRounds; ++round)
         charts = LloydRound(mesh, rules, grower, charts, chartOf, seedOf.Data(), queue.Data(), depth.Data());
+    if (grower.Failed())
+        return kNoChart;
     Scratch<Border> borders, sorted;
     Scratch<Cone> cone;
     Scratch<ChartProxy> proxy;

@@ -153,12 +153,9 @@ namespace
         }
     };
 
-    // Compares the boundary edges that share a grid cell; each pair only in the cell of the lower
-    // left corner of their (widened) boxes' overlap.
-    bool BoundarySimple(const FlatChart& flat, const uint32_t* edges, uint32_t count, SplitSeeds* seeds)
+    // The grid over the chart's box, about one cell per boundary edge (at most 1024 x 1024).
+    bool MakeGrid(const FlatChart& flat, uint32_t count, Grid* grid)
     {
-        if (count < 3)
-            return true;
         double minX = 1e300, minY = 1e300, maxX = -1e300, maxY = -1e300;
         for (uint32_t v = 0; v < flat.vertexCount; ++v)
         {
@@ -169,17 +166,19 @@ namespace
             maxY = p.y > maxY ? p.y : maxY;
         }
         double size = maxX - minX > maxY - minY ? maxX - minX : maxY - minY;
-        if (!(size > 0))
-            return false;
         uint32_t side = (uint32_t)Sqrt((double)count) + 1;
         side = side > 1024 ? 1024 : side;
-        Grid grid = {minX, minY, size / side, 1e-6 * size, side};
-        uint64_t cells = (uint64_t)side * side, budget = 64ull * count + 4096;
-        Scratch<uint32_t> start, members;
-        if (!start.Allocate(cells + 1) || !members.Allocate(budget))
-            return false;
-        memset(start.Data(), 0, (cells + 1) * sizeof(uint32_t));
-        uint64_t total = 0;
+        *grid = {minX, minY, size / side, 1e-6 * size, side};
+        return size > 0;
+    }
+
+    // Lists the edges meeting each cell: members[start[c] .. start[c + 1]). False when the lists
+    // would pass `budget` entries.
+    bool FillGrid(const Grid& grid, const FlatChart& flat, const uint32_t* edges, uint32_t count, uint32_t* start,
+                  uint32_t* members, uint64_t budget)
+    {
+        uint64_t cells = (uint64_t)grid.side * grid.side, total = 0;
+        memset(start, 0, (cells + 1) * sizeof(uint32_t));
         for (int pass = 0; pass < 2; ++pass)
         {
             for (uint32_t e = 0; e < count; ++e)
@@ -192,21 +191,40 @@ namespace
                         if (pass == 0 && ++total > budget)
                             return false;
                         if (pass == 0)
-                            ++start[(uint64_t)y * side + x + 1];
+                            ++start[(uint64_t)y * grid.side + x + 1];
                         else
-                            members[start[(uint64_t)y * side + x]++] = e;
+                            members[start[(uint64_t)y * grid.side + x]++] = e;
                     }
             }
-            if (pass == 0)
-                for (uint64_t c = 0; c < cells; ++c)
-                    start[c + 1] += start[c];
-            else
-            {
-                for (uint64_t c = cells; c > 0; --c)
-                    start[c] = start[c - 1];
-                start[0] = 0;
-            }
+            for (uint64_t c = 0; c < cells && pass == 0; ++c)
+                start[c + 1] += start[c];
         }
+        for (uint64_t c = cells; c > 0; --c)   // the fill moved every start one cell on
+            start[c] = start[c - 1];
+        start[0] = 0;
+        return true;
+    }
+
+    double Low(double a, double b, double c, double d)
+    {
+        double first = a < b ? a : b, second = c < d ? c : d;
+        return first > second ? first : second;
+    }
+
+    // Compares the boundary edges that share a grid cell; each pair only in the cell of the lower
+    // left corner of their (widened) boxes' overlap.
+    bool BoundarySimple(const FlatChart& flat, const uint32_t* edges, uint32_t count, SplitSeeds* seeds)
+    {
+        Grid grid;
+        if (count < 3)
+            return true;
+        if (!MakeGrid(flat, count, &grid))
+            return false;
+        uint64_t cells = (uint64_t)grid.side * grid.side, budget = 64ull * count + 4096;
+        Scratch<uint32_t> start, members;
+        if (!start.Allocate(cells + 1) || !members.Allocate(budget) ||
+            !FillGrid(grid, flat, edges, count, start.Data(), members.Data(), budget))
+            return false;
         uint64_t comparisons = 256ull * count + 100000;
         for (uint64_t c = 0; c < cells; ++c)
             for (uint32_t i = start[c]; i < start[c + 1]; ++i)
@@ -217,9 +235,8 @@ namespace
                     if (e[0] == f[0] || e[0] == f[1] || e[1] == f[0] || e[1] == f[1])
                         continue;   // edges that follow each other: the fan check covers them
                     Point p = UV(flat, e[0]), q = UV(flat, e[1]), r = UV(flat, f[0]), s = UV(flat, f[1]);
-                    double lowX = (p.x < q.x ? p.x : q.x) > (r.x < s.x ? r.x : s.x) ? (p.x < q.x ? p.x : q.x) : (r.x < s.x ? r.x : s.x);
-                    double lowY = (p.y < q.y ? p.y : q.y) > (r.y < s.y ? r.y : s.y) ? (p.y < q.y ? p.y : q.y) : (r.y < s.y ? r.y : s.y);
-                    if ((uint64_t)grid.Cell(lowY - grid.tolerance, minY) * side + grid.Cell(lowX - grid.tolerance, minX) != c)
+                    double lowX = Low(p.x, q.x, r.x, s.x) - grid.tolerance, lowY = Low(p.y, q.y, r.y, s.y) - grid.tolerance;
+                    if ((uint64_t)grid.Cell(lowY, grid.minY) * grid.side + grid.Cell(lowX, grid.minX) != c)
                         continue;
                     if (comparisons-- == 0)
                         return false;
@@ -229,8 +246,6 @@ namespace
         return true;
     }
 }
-
-
 
 bool ChartIsValid(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t chart, const uint32_t* triangles, uint32_t count,
                   const FlatChart& flat, const DistortionLimits& limits, ChartMeasure* measure, SplitSeeds* seeds)

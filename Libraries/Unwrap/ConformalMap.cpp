@@ -1,16 +1,11 @@
 #include "ConformalMap.h"
 
+#include "HermitianMatrix.h"
 #include "WinImports.h"
 
 namespace
 {
     const double kMaxCotangent = 1e4;   // slivers: keeps the matrix finite and the solver steady
-
-    struct Entry
-    {
-        uint32_t column;
-        double laplace, area;
-    };
 
     // Cotangent of the 3D corner angle at corner c of triangle t, clamped.
     double Cotangent(const ChartMesh& mesh, uint32_t t, uint32_t c)
@@ -23,94 +18,29 @@ namespace
         return cot > kMaxCotangent ? kMaxCotangent : (cot < -kMaxCotangent ? -kMaxCotangent : cot);
     }
 
-    // The quadratic form of the conformal energy in compressed rows: row i holds the off-diagonal
-    // entries (j, L_ij, B_ij); diag holds L_ii.
-    struct Matrix
+    // The conformal energy's matrix: per directed triangle edge a -> b with opposite corner k,
+    // L gets w = cot(angle at k) / 2 on both diagonals and -w off them, B gets +1/2 at (a, b) and
+    // -1/2 at (b, a) (the area form).
+    bool BuildConformalMatrix(const ChartMesh& mesh, const uint32_t* triangles, uint32_t count, const uint32_t* corner,
+                              uint32_t vertices, HermitianMatrix* h)
     {
-        uint32_t n = 0;
-        Scratch<uint32_t> rowStart;
-        Scratch<Entry> entries;
-        Scratch<double> diag;
-
-        bool Build(const ChartMesh& mesh, const uint32_t* triangles, uint32_t count, const uint32_t* corner, uint32_t vertices)
-        {
-            n = vertices;
-            if (!rowStart.Allocate(n + 1ull) || !entries.Allocate(6ull * count) || !diag.Allocate(n))
-                return false;
-            memset(rowStart.Data(), 0, (n + 1ull) * sizeof(uint32_t));
-            memset(diag.Data(), 0, n * sizeof(double));
-            for (uint32_t i = 0; i < 3 * count; ++i)   // every corner starts one directed edge, which fills two rows
+        Scratch<uint32_t> rows;
+        Scratch<MatrixEntry> triplets;
+        if (!rows.Allocate(12ull * count) || !triplets.Allocate(12ull * count))
+            return false;
+        uint64_t k = 0;
+        for (uint32_t i = 0; i < count; ++i)
+            for (uint32_t c = 0; c < 3; ++c)
             {
-                ++rowStart[corner[i] + 1];
-                ++rowStart[corner[i % 3 == 2 ? i - 2 : i + 1] + 1];
+                uint32_t a = corner[3 * i + c], b = corner[3 * i + (c + 1) % 3];
+                double w = 0.5 * Cotangent(mesh, triangles[i], (c + 2) % 3);
+                rows[k] = a, triplets[k++] = {b, -w, 0.5};
+                rows[k] = b, triplets[k++] = {a, -w, -0.5};
+                rows[k] = a, triplets[k++] = {a, w, 0};
+                rows[k] = b, triplets[k++] = {b, w, 0};
             }
-            for (uint32_t i = 0; i < n; ++i)
-                rowStart[i + 1] += rowStart[i];
-            for (uint32_t k = 0; k < count; ++k)
-                for (uint32_t c = 0; c < 3; ++c)
-                {
-                    uint32_t a = corner[3 * k + c], b = corner[3 * k + (c + 1) % 3];
-                    double w = 0.5 * Cotangent(mesh, triangles[k], (c + 2) % 3);
-                    diag[a] += w;
-                    diag[b] += w;
-                    entries[rowStart[a]++] = {b, -w, 0.5};
-                    entries[rowStart[b]++] = {a, -w, -0.5};
-                }
-            for (uint32_t i = n; i > 0; --i)
-                rowStart[i] = rowStart[i - 1];
-            rowStart[0] = 0;
-            Compress();
-            return true;
-        }
-
-        // Sorts every row by column and sums entries of one column.
-        void Compress()
-        {
-            uint32_t out = 0;
-            for (uint32_t i = 0; i < n; ++i)
-            {
-                uint32_t begin = rowStart[i], end = rowStart[i + 1];
-                for (uint32_t a = begin + 1; a < end; ++a)
-                {
-                    Entry e = entries[a];
-                    uint32_t b = a;
-                    for (; b > begin && entries[b - 1].column > e.column; --b)
-                        entries[b] = entries[b - 1];
-                    entries[b] = e;
-                }
-                rowStart[i] = out;
-                for (uint32_t a = begin; a < end; ++a)
-                {
-                    if (out > rowStart[i] && entries[out - 1].column == entries[a].column)
-                    {
-                        entries[out - 1].laplace += entries[a].laplace;
-                        entries[out - 1].area += entries[a].area;
-                    }
-                    else
-                        entries[out++] = entries[a];
-                }
-            }
-            rowStart[n] = out;
-        }
-
-        // y = H x for x, y interleaved (u0, v0, u1, v1, ...).
-        void Multiply(const double* x, double* y) const
-        {
-            for (uint32_t i = 0; i < n; ++i)
-            {
-                double yu = diag[i] * x[2 * i], yv = diag[i] * x[2 * i + 1];
-                for (uint32_t a = rowStart[i]; a < rowStart[i + 1]; ++a)
-                {
-                    const Entry& e = entries[a];
-                    double u = x[2 * e.column], v = x[2 * e.column + 1];
-                    yu += e.laplace * u - e.area * v;
-                    yv += e.area * u + e.laplace * v;
-                }
-                y[2 * i] = yu;
-                y[2 * i + 1] = yv;
-            }
-        }
-    };
+        return h->FromTriplets(vertices, rows.Data(), triplets.Data(), k);
+    }
 
     // Incomplete Cholesky factor (no fill) of H seen as the complex Hermitian matrix L + iB acting
     // on z = u + iv: H ~ F F^H with F lower triangular on the pattern of H. Rows and columns of the
@@ -118,13 +48,13 @@ namespace
     // of H (obtuse triangles make H no M-matrix, so this can happen).
     struct Preconditioner
     {
-        const Matrix* h = nullptr;
+        const HermitianMatrix* h = nullptr;
         Scratch<double> re, im, pivot;   // re/im aligned with h->entries (lower part used)
         uint32_t pin0 = 0, pin1 = 0;
 
         bool Pinned(uint32_t i) const { return i == pin0 || i == pin1; }
 
-        bool Factor(const Matrix& matrix, uint32_t p0, uint32_t p1)
+        bool Factor(const HermitianMatrix& matrix, uint32_t p0, uint32_t p1)
         {
             h = &matrix;
             pin0 = p0;
@@ -212,19 +142,19 @@ namespace
     }
 
     // Preconditioned conjugate gradients on H x = 0 with the four coordinates of the pins held.
-    bool ConjugateGradients(const Matrix& h, double* x, uint32_t pin0, uint32_t pin1)
+    bool ConjugateGradients(const HermitianMatrix& h, double* x, uint32_t pin0, uint32_t pin1)
     {
         uint64_t m = 2ull * h.n;
         Scratch<double> r, z, p, q;
-        Preconditioner precondition;
-        if (!r.Allocate(m) || !z.Allocate(m) || !p.Allocate(m) || !q.Allocate(m) || !precondition.Factor(h, pin0, pin1))
+        Preconditioner incomplete;
+        if (!r.Allocate(m) || !z.Allocate(m) || !p.Allocate(m) || !q.Allocate(m) || !incomplete.Factor(h, pin0, pin1))
             return false;
         auto clearPins = [pin0, pin1](double* a) { a[2 * pin0] = a[2 * pin0 + 1] = a[2 * pin1] = a[2 * pin1 + 1] = 0; };
         h.Multiply(x, r.Data());
         for (uint64_t i = 0; i < m; ++i)
             r[i] = -r[i];
         clearPins(r.Data());
-        precondition.Apply(r.Data(), z.Data());
+        incomplete.Apply(r.Data(), z.Data());
         memcpy(p.Data(), z.Data(), m * sizeof(double));
         double rz = DotN(r.Data(), z.Data(), m);
         // A residual 1e-5 of the start's, within 50 + 4 sqrt(n) steps: further digits change the
@@ -247,7 +177,7 @@ namespace
             }
             if (DotN(r.Data(), r.Data(), m) <= stop)
                 break;
-            precondition.Apply(r.Data(), z.Data());
+            incomplete.Apply(r.Data(), z.Data());
             double next = DotN(r.Data(), z.Data(), m);
             double beta = next / rz;
             rz = next;
@@ -354,8 +284,8 @@ void ConformalMapper::Project(const uint32_t* triangles, uint32_t count, FlatCha
 
 bool ConformalMapper::Solve(const uint32_t* triangles, uint32_t count, FlatChart* out, uint32_t pin0, uint32_t pin1)
 {
-    Matrix h;
-    if (!h.Build(*m_Mesh, triangles, count, out->corner.Data(), out->vertexCount))
+    HermitianMatrix h;
+    if (!BuildConformalMatrix(*m_Mesh, triangles, count, out->corner.Data(), out->vertexCount, &h))
         return false;
     if (!ConjugateGradients(h, out->uv.Data(), pin0, pin1))
         return false;

@@ -57,7 +57,7 @@ namespace
 
 namespace
 {
-    // Counting sort of the non-degenerate triangles' corners by vertex.
+    // Counting sort of the non-degenerate triangles' corners (3t + c) by vertex.
     void ListTrianglesAroundVertices(const ChartMesh& mesh, uint32_t* start, uint32_t* around)
     {
         memset(start, 0, (mesh.vertexCount + 1ull) * sizeof(uint32_t));
@@ -68,7 +68,7 @@ namespace
             start[v + 1] += start[v];
         for (uint32_t i = 0; i < 3 * mesh.triCount; ++i)
             if (!mesh.degenerate[i / 3])
-                around[start[mesh.tri[i]]++] = i / 3;
+                around[start[mesh.tri[i]]++] = i;
         for (uint32_t v = mesh.vertexCount; v > 0; --v)
             start[v] = start[v - 1];
         start[0] = 0;
@@ -87,16 +87,19 @@ bool PrepareMesh(const float* vertex, uint32_t vertexCount, const uint32_t* tri,
     if (!out->twin.Allocate(3ull * triCount) || !out->normal.Allocate(triCount) || !out->area.Allocate(triCount) ||
         !out->curvature.Allocate(triCount) || !out->degenerate.Allocate(triCount) ||
         !out->aroundStart.Allocate(vertexCount + 1ull) || !out->around.Allocate(3ull * triCount + 1) ||
-        !out->cornerAngle.Allocate(3ull * triCount))
+        !out->cornerAngle.Allocate(3ull * triCount) || !out->edgeLength.Allocate(3ull * triCount))
         return false;
     MeasureTriangles(vertex, tri, triCount, out->normal.Data(), out->area.Data(), out->degenerate.Data());
     if (!FindTwins(tri, triCount, vertexCount, out->twin.Data()))
         return false;
     out->mesh = {vertex,          vertexCount,          tri,       triCount, out->normal.Data(), out->area.Data(),
                  out->curvature.Data(), out->degenerate.Data(), out->twin.Data(), srcPoly, out->aroundStart.Data(),
-                 out->around.Data(), out->cornerAngle.Data()};
+                 out->around.Data(), out->cornerAngle.Data(), out->edgeLength.Data()};
     for (uint32_t h = 0; h < 3 * triCount; ++h)
+    {
         out->cornerAngle[h] = out->degenerate[h / 3] ? 0.0f : (float)CornerAngle3(out->mesh, h / 3, h % 3);
+        out->edgeLength[h] = (float)Length(Position(vertex, tri[NextCorner(h)]) - Position(vertex, tri[h]));
+    }
     ListTrianglesAroundVertices(out->mesh, out->aroundStart.Data(), out->around.Data());
     double hardAngle = param.hardAngle * (kPi / 180);
     CutSeams(out->mesh, cos(hardAngle), out->twin.Data());

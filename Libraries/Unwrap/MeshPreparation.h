@@ -13,8 +13,8 @@
 //     all of whose edges are linked (interior vertices of the cut surface). A chart's sum of it
 //     tells how far from developable the chart is, which conformal flattening turns into area
 //     distortion; signed, so that the noise of scanned surfaces cancels out as it does in the map;
-//   - each vertex's non-degenerate triangles and every corner's angle (for the growing's tests at
-//     vertices).
+//   - each vertex's corners in non-degenerate triangles, every corner's angle and every edge's length (for
+//     the growing's costs and its tests at vertices).
 // Cost: linear in vertices + triangles; about 70 bytes a triangle.
 #pragma once
 
@@ -25,7 +25,7 @@
 struct PreparedMesh
 {
     Scratch<uint32_t> welded, twin, aroundStart, around;
-    Scratch<float> cornerAngle;
+    Scratch<float> cornerAngle, edgeLength;
     Scratch<Vec3> normal;
     Scratch<double> area, curvature;
     Scratch<uint8_t> degenerate;
