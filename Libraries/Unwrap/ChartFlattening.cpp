@@ -25,7 +25,7 @@ namespace
         bool Allocate()
         {
             uint64_t T = m_Mesh.triCount + 1ull;
-            return m_Grower.Allocate(m_Mesh, m_ChartOf) && m_Mapper.Allocate(m_Mesh) && m_Members.Allocate(T) &&
+            return m_Mapper.Allocate(m_Mesh) && m_Members.Allocate(T) &&
                    m_Depth.Allocate(T) && m_Queue.Allocate(T) && m_Stack.Allocate(T) && m_Slot.Allocate(T + 1);
         }
 
@@ -72,6 +72,9 @@ namespace
                     continue;
                 }
                 ++stats->splits;
+                // The grower's memory is taken at the first split: most meshes never need it.
+                if (!m_GrowerReady && !(m_GrowerReady = m_Grower.Allocate(m_Mesh, m_ChartOf)))
+                    return false;
                 Split(r, seeds);
                 if (m_Grower.Failed())
                     return false;
@@ -178,6 +181,7 @@ namespace
         Scratch<uint32_t> m_Members, m_Depth, m_Queue, m_Slot;
         Scratch<Range> m_Stack;
         uint32_t m_StackSize = 0, m_NextChart = 0;
+        bool m_GrowerReady = false;
     };
 
     // The UV of vertex v in chart c, from a non-degenerate triangle of c around v; false if none.
