@@ -51,6 +51,34 @@ namespace
         const HermitianMatrix* h = nullptr;
         Scratch<double> re, im, pivot;   // re/im aligned with h->entries (lower part used)
         uint32_t pin0 = 0, pin1 = 0;
+        // The factor's strictly lower part packed row by row for the solves: (re, im) pairs.
+        Scratch<uint32_t> lowerStart, lowerColumn;
+        Scratch<double> lower, inversePivot;
+
+        bool Pack()
+        {
+            uint32_t n = h->n, count = 0;
+            for (uint32_t i = 0; i < n; ++i)
+                for (uint32_t a = h->rowStart[i]; a < h->rowStart[i + 1] && h->entries[a].column < i; ++a)
+                    ++count;
+            if (!lowerStart.Allocate(n + 1ull) || !lowerColumn.Allocate(count + 1ull) || !lower.Allocate(2ull * count + 2) ||
+                !inversePivot.Allocate(n + 1ull))
+                return false;
+            uint32_t k = 0;
+            for (uint32_t i = 0; i < n; ++i)
+            {
+                lowerStart[i] = k;
+                inversePivot[i] = 1 / pivot[i];
+                for (uint32_t a = h->rowStart[i]; a < h->rowStart[i + 1] && h->entries[a].column < i; ++a, ++k)
+                {
+                    lowerColumn[k] = h->entries[a].column;
+                    lower[2ull * k] = re[a];
+                    lower[2ull * k + 1] = im[a];
+                }
+            }
+            lowerStart[n] = k;
+            return true;
+        }
 
         bool Pinned(uint32_t i) const { return i == pin0 || i == pin1; }
 
@@ -97,7 +125,7 @@ namespace
                 double d = matrix.diag[i] - sum;
                 pivot[i] = Pinned(i) ? 1 : Sqrt(d > 1e-8 * matrix.diag[i] ? d : (matrix.diag[i] > 0 ? matrix.diag[i] : 1));
             }
-            return true;
+            return Pack();
         }
 
         // z = (F F^H)^-1 r, both interleaved (u, v); z may not alias r.
@@ -107,25 +135,27 @@ namespace
             for (uint32_t i = 0; i < n; ++i)   // F y = r
             {
                 double yr = r[2 * i], yi = r[2 * i + 1];
-                for (uint32_t a = h->rowStart[i]; a < h->rowStart[i + 1] && h->entries[a].column < i; ++a)
+                for (uint32_t a = lowerStart[i]; a < lowerStart[i + 1]; ++a)
                 {
-                    uint32_t k = h->entries[a].column;
-                    yr -= re[a] * z[2 * k] - im[a] * z[2 * k + 1];
-                    yi -= re[a] * z[2 * k + 1] + im[a] * z[2 * k];
+                    uint32_t k = lowerColumn[a];
+                    double fr = lower[2ull * a], fi = lower[2ull * a + 1];
+                    yr -= fr * z[2 * k] - fi * z[2 * k + 1];
+                    yi -= fr * z[2 * k + 1] + fi * z[2 * k];
                 }
-                z[2 * i] = yr / pivot[i];
-                z[2 * i + 1] = yi / pivot[i];
+                z[2 * i] = yr * inversePivot[i];
+                z[2 * i + 1] = yi * inversePivot[i];
             }
             for (uint32_t i = n; i-- > 0;)   // F^H z = y, column by column
             {
-                z[2 * i] /= pivot[i];
-                z[2 * i + 1] /= pivot[i];
-                double zr = z[2 * i], zi = z[2 * i + 1];
-                for (uint32_t a = h->rowStart[i]; a < h->rowStart[i + 1] && h->entries[a].column < i; ++a)
+                double zr = z[2 * i] * inversePivot[i], zi = z[2 * i + 1] * inversePivot[i];
+                z[2 * i] = zr;
+                z[2 * i + 1] = zi;
+                for (uint32_t a = lowerStart[i]; a < lowerStart[i + 1]; ++a)
                 {
-                    uint32_t k = h->entries[a].column;
-                    z[2 * k] -= re[a] * zr + im[a] * zi;
-                    z[2 * k + 1] -= re[a] * zi - im[a] * zr;
+                    uint32_t k = lowerColumn[a];
+                    double fr = lower[2ull * a], fi = lower[2ull * a + 1];
+                    z[2 * k] -= fr * zr + fi * zi;
+                    z[2 * k + 1] -= fr * zi - fi * zr;
                 }
             }
             if (n)
