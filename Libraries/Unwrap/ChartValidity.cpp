@@ -81,6 +81,9 @@ namespace
         memset(angleSum.Data(), 0, n * sizeof(double));
         memset(in.Data(), 0, n * sizeof(uint32_t));
         memset(out.Data(), 0, n * sizeof(uint32_t));
+        memset(firstOut.Data(), 0xFF, n * sizeof(uint32_t));   // kNoChart: no seed
+        memset(lastOut.Data(), 0xFF, n * sizeof(uint32_t));
+        memset(lastIn.Data(), 0xFF, n * sizeof(uint32_t));
         *edgeCount = 0;
         for (uint32_t i = 0; i < count; ++i)
             for (uint32_t c = 0; c < 3; ++c)
