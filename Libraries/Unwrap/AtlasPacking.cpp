@@ -5,15 +5,18 @@
 // 2. For a trial scale, pack every chart (PackRaster, PackPlacement) into a strip as wide as the
 //    atlas and twice as high, in each of 8 orientations (the minimum-area box one and its turns by
 //    45 degrees; 2 for charts under two texels), keeping the orientation with the lowest top.
-//    The trial succeeds when the charts end within the atlas's height.
+//    A trial within 5 % of the scale of the last such search keeps each chart's orientation and
+//    draws it once. The trial succeeds when the charts end within the atlas's height.
 // 3. Search the largest scale that succeeds: each trial's used height predicts the next scale,
 //    bounded by the best success and the smallest failure, until they are within 1 %.
 // 4. Move every corner to its chart's place.
 //
-// The margin: charts are dilated by half the margin (plus a slack for float rounding) and drawn
-// conservatively, and the atlas bitmap is inset by half the margin from the square's border, so
-// charts whose bitmaps do not share a texel are at least the margin apart and from the border.
-// Each trial costs the rows of every triangle in every orientation; at most kMaxTrials trials.
+// The margin: charts are drawn conservatively and dilated by whole texels covering half the
+// margin plus a slack for float rounding, and the atlas bitmap is inset by at least as much from
+// the square's border, so charts whose bitmaps share no texel are at least the margin apart and
+// from the border. The finished UVs are checked against the border once more.
+// Each trial costs the rows of every triangle in every orientation tried, plus the placement
+// searches (bounded, see PackPlacement.h); at most kMaxTrials trials.
 #include "AtlasPacking.h"
 
 #include "PackOrientation.h"
