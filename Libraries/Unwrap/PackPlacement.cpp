@@ -126,9 +126,10 @@ namespace
         uint32_t width = atlas.width, w = chart.width;
         if (w > width)
             return false;
-        uint32_t g = (w + 63) / 64, atlasGroupWidth = (width + 255) / 256;
-        g = g > atlasGroupWidth ? g : (atlasGroupWidth ? atlasGroupWidth : 1);
-        uint32_t groups = (w + g - 1) / g, atlasGroups = (width + g - 1) / g;
+        // Group widths are multiples of the atlas's base group, whose highest skies it keeps.
+        uint32_t base = atlas.skyGroupWidth, perGroup = ((w + 63) / 64 + base - 1) / base;
+        uint32_t g = base * perGroup;
+        uint32_t groups = (w + g - 1) / g, atlasGroups = (width + g - 1) / g, baseGroups = (width + base - 1) / base;
         int64_t bottom[65], sky[257];
         for (uint32_t j = 0; j < groups; ++j)
         {
@@ -140,8 +141,8 @@ namespace
         for (uint32_t j = 0; j < atlasGroups; ++j)
         {
             sky[j] = 0;
-            for (uint32_t x = j * g; x < (j + 1) * g && x < width; ++x)
-                sky[j] = atlas.sky[x] > sky[j] ? atlas.sky[x] : sky[j];
+            for (uint32_t b = j * perGroup; b < (j + 1) * perGroup && b < baseGroups; ++b)
+                sky[j] = atlas.skyGroup[b] > sky[j] ? atlas.skyGroup[b] : sky[j];
         }
         int64_t bestY = -1;
         uint32_t bestGroup = 0;
@@ -176,7 +177,9 @@ bool AtlasOccupancy::Reset(uint32_t atlasWidth, uint32_t atlasRows)
     if (atlasWidth != width || atlasRows != rows)
     {
         width = atlasWidth, rows = atlasRows, words = (atlasWidth + 63) / 64 + 1;
-        if (!bits.Allocate((uint64_t)words * rows) || !longestFree.Allocate(rows) || !sky.Allocate(width))
+        skyGroupWidth = (width + 255) / 256;
+        if (!bits.Allocate((uint64_t)words * rows) || !longestFree.Allocate(rows) || !sky.Allocate(width) ||
+            !skyGroup.Allocate(width / skyGroupWidth + 1))
             return (width = rows = 0), false;
     }
     // Texels right of the atlas (the last word's tail and the padding word) count as taken.
@@ -192,6 +195,7 @@ bool AtlasOccupancy::Reset(uint32_t atlasWidth, uint32_t atlasRows)
     for (uint32_t y = 0; y < rows; ++y)
         longestFree[y] = width;
     memset(sky.Data(), 0, width * 4ull);
+    memset(skyGroup.Data(), 0, (width / skyGroupWidth + 1) * 4ull);
     for (uint32_t n = 0; n <= 64; ++n)
         lowestRowWithRun[n] = 0;
     top = 0;
@@ -229,6 +233,10 @@ void PlaceChart(AtlasOccupancy& atlas, const ChartRaster& chart, Placement at)
     }
     for (uint32_t j = 0; j < chart.width; ++j)
         if (chart.columnHigh[j] != kNoRow && at.y + chart.columnHigh[j] + 1 > atlas.sky[at.x + j])
-            atlas.sky[at.x + j] = at.y + chart.columnHigh[j] + 1;
+        {
+            uint32_t top = at.y + chart.columnHigh[j] + 1, group = (at.x + j) / atlas.skyGroupWidth;
+            atlas.sky[at.x + j] = top;
+            atlas.skyGroup[group] = top > atlas.skyGroup[group] ? top : atlas.skyGroup[group];
+        }
     atlas.top = at.y + chart.height > atlas.top ? at.y + chart.height : atlas.top;
 }

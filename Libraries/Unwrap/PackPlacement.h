@@ -6,7 +6,8 @@
 // - Skyline: every atlas column keeps the row above its highest taken texel; the chart rests on
 //   it with its own lowest texel of each column (shapes interlock, holes below the skyline stay
 //   unused). Positions are first compared on columns grouped by g (at most 64 groups a chart,
-//   256 an atlas: the group's highest skyline against its lowest chart texel, which can only
+//   256 an atlas; g a multiple of a base group whose highest skyline the atlas keeps up to
+//   date: the group's highest skyline against its lowest chart texel, which can only
 //   overestimate), then the best group's g positions either side are worked out exactly.
 // - Holes: the bitmap below the skyline's best top is searched bottom-left, within a budget.
 //   Each atlas row keeps its longest free run, so rows that cannot hold the chart's runs are
@@ -30,6 +31,8 @@ struct AtlasOccupancy
     Scratch<uint64_t> bits;
     Scratch<uint32_t> longestFree;             // longest run of free texels in each row
     Scratch<uint32_t> sky;                     // each column: the row above its highest taken texel
+    uint32_t skyGroupWidth = 1;                // columns a base group, so that there are at most 256
+    Scratch<uint32_t> skyGroup;                // the highest sky of each base group
     uint32_t lowestRowWithRun[65] = {};        // lowest row holding a free run of n texels, n <= 64
     uint32_t top = 0;                          // rows [top, rows) are empty
 

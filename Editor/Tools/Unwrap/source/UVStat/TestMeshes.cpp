@@ -127,6 +127,18 @@ namespace UVStat
         return mesh;
     }
 
+    TestMesh ManyTriangles(uint32_t count)
+    {
+        TestMesh mesh;
+        for (uint32_t i = 0; i < count; ++i)
+        {
+            double size = 0.6 + 0.4 * ((i * 7919u) % 11) / 11.0, x = 2.0 * (i % 128), y = 2.0 * (i / 128);
+            uint32_t a = mesh.Add(x, y, 0), b = mesh.Add(x + size, y, 0.2 * size), c = mesh.Add(x, y + size, 0.3);
+            mesh.Face(a, b, c);
+        }
+        return mesh;
+    }
+
     TestMesh DirtyMesh()
     {
         TestMesh mesh;

@@ -37,6 +37,8 @@ namespace UVStat
     TestMesh SaddleFan(uint32_t spokes, uint32_t waves, double height);
     // `count` separate tetrahedra of varied sizes, in a row.
     TestMesh ManyComponents(uint32_t count);
+    // `count` separate triangles, tilted and of varied sizes, in rows.
+    TestMesh ManyTriangles(uint32_t count);
     // A grid strip with a fin (an edge of three triangles), a duplicated face, a face with the
     // opposite winding over the same vertices, and collinear and zero-size triangles.
     TestMesh DirtyMesh();
