@@ -2,7 +2,6 @@
 
 #include "ChartGrowing.h"
 #include "ChartLayout.h"
-#include "ChartOrientation.h"
 #include "MeshAdjacency.h"
 #include "Scratch.h"
 #include "WinImports.h"
@@ -63,8 +62,6 @@ namespace
                 SplitSeeds seeds = {kNoChart, kNoChart};
                 if (count == 1 || ChartIsValid(m_Mesh, m_ChartOf, r.chart, triangles, count, flat, m_Limits, &measure, &seeds))
                 {
-                    if (!TurnToSmallestBox(flat.uv.Data(), flat.vertexCount))
-                        return false;
                     double chartArea = Write(triangles, count, flat);
                     stats->angleDistortion += measure.angleDistortion * chartArea;
                     stats->areaDistortion += measure.areaDistortion * chartArea;

@@ -2,8 +2,7 @@
 // and, when it fails, split in two and both parts flattened again.
 //
 // Input: chartOf from segmentation (charts 0 .. chartCount-1, degenerate triangles kNoChart).
-// Output: outUV (6 floats a triangle) in mesh units, each chart turned to its smallest bounding
-// rectangle (ChartOrientation.h), and
+// Output: outUV (6 floats a triangle) in mesh units, each chart at any place and orientation, and
 // chartOf for every triangle with charts 0 .. (returned count)-1.
 // Splitting: two seeds on either side of the place where the chart failed (ChartValidity.h), or,
 // for distortion, as far apart as the chart's linked edges allow (the farthest triangle from the

@@ -15,7 +15,7 @@
 //     distortion; signed, so that the noise of scanned surfaces cancels out as it does in the map;
 //   - each vertex's corners in non-degenerate triangles, every corner's angle and every edge's length (for
 //     the growing's costs and its tests at vertices).
-// Cost: linear in vertices + triangles; about 70 bytes a triangle.
+// Cost: linear in vertices + triangles; about 90 bytes a triangle.
 #pragma once
 
 #include "ChartMesh.h"
