@@ -3,7 +3,7 @@
 # Safe to run repeatedly: it only calls apt-get when something is missing.
 set -euo pipefail
 
-packages=(build-essential cmake ninja-build pkg-config libunittest++-dev clang lld llvm
+packages=(build-essential cmake ninja-build pkg-config libunittest++-dev libgmp-dev clang lld llvm
           # the libFuzzer and sanitizer runtimes for scripts/fuzz.sh
           libclang-rt-14-dev
           # chartbake-mesh: mesh import (OBJ, PLY, STL, FBX), glTF round trip, layout pictures

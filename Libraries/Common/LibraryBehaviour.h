@@ -9,6 +9,8 @@
 //                       "rounding toward zero|to nearest|..., denormals kept|flushed, control <hex>\n"
 //   unwrap-report-inputs  like unwrap-warn, but the text tells the parameters, counts and optional
 //                       arrays it was called with (Libraries/Unwrap/BehaviourReports.h)
+//   unwrap-report-stats like unwrap-warn, but the text tells how the chart layout went: "segmented
+//                       <n> charts, <n> splits, <n> charts, angle distortion <x>, area distortion <x>\n"
 //   unwrap-grid         GenerateSecondaryUVSet lays out every triangle as a chart of its own, in a
 //                       grid of equal cells (the layout of Libraries/Unwrap/ChartLayout.h)
 //   fail:<export>       the named test export returns false

@@ -1,6 +1,7 @@
 #include "ChartMesh.h"
 
-void MeasureTriangles(const float* vertex, const uint32_t* tri, uint32_t triCount, Vec3* cross, uint8_t* degenerate)
+void MeasureTriangles(const float* vertex, const uint32_t* tri, uint32_t triCount, Vec3* normal, double* area,
+                      uint8_t* degenerate)
 {
     for (uint32_t t = 0; t < triCount; ++t)
     {
@@ -9,7 +10,18 @@ void MeasureTriangles(const float* vertex, const uint32_t* tri, uint32_t triCoun
         double longest = Dot(e0, e0);
         longest = Dot(e1, e1) > longest ? Dot(e1, e1) : longest;
         longest = Dot(e2, e2) > longest ? Dot(e2, e2) : longest;
-        cross[t] = Cross(e0, p2 - p0);
-        degenerate[t] = !(Length(cross[t]) > 1e-9 * longest) || longest == 0;
+        Vec3 cross = Cross(e0, p2 - p0);
+        double twice = Length(cross);
+        degenerate[t] = !(twice > 1e-9 * longest) || longest == 0;
+        area[t] = degenerate[t] ? 0 : 0.5 * twice;
+        normal[t] = degenerate[t] ? Vec3{0, 0, 0} : cross * (1 / twice);
     }
+}
+
+double CornerAngle3(const ChartMesh& mesh, uint32_t t, uint32_t c)
+{
+    const uint32_t* v = mesh.tri + 3 * t;
+    Vec3 p = Position(mesh.vertex, v[c]);
+    Vec3 a = Position(mesh.vertex, v[(c + 1) % 3]) - p, b = Position(mesh.vertex, v[(c + 2) % 3]) - p;
+    return AngleOf(Length(Cross(a, b)), Dot(a, b));
 }

@@ -1,29 +1,27 @@
-// Splits a mesh into charts by region growing over edge adjacency.
+// Stage 2 of the chart unwrapper: segmentation into charts that flatten well.
 //
-// A chart starts at the lowest-numbered triangle not yet in a chart and takes in, breadth first,
-// neighbours across twin edges while all of these hold for the neighbour w reached from chart
-// triangle u, with n the chart's current normal (the normalised sum of its triangles' cross
-// products):
-//   - dihedral angle: the angle between the normals of u and w is below hardAngle, unless u and
-//     w come from one source polygon (srcPoly), which is meant to stay in one piece;
-//   - area distortion: 1 - cos(angle between w's normal and n) is at most the threshold; that is
-//     the share of w's area lost when it is projected onto the chart plane, and cos > 0 keeps the
-//     projection from flipping w;
-//   - angle distortion: max over w's corners of |projected angle - true angle| / true angle is at
-//     most the threshold.
-// Degenerate triangles make single-triangle charts of their own and link nothing.
+// Input: the prepared mesh (seams cut, MeshPreparation.h) and the rules for growing
+// (ChartGrowing.h). Output: chartOf[t] for every triangle, charts numbered 0 .. count-1 in order of
+// their lowest triangle; degenerate triangles get kNoChart (stage 3 places them).
+// Steps:
+//   1. charts grown one after another, each from a triangle the previous ones turned down, so
+//      that seeds spread out from where the charts already are;
+//   2. a few Lloyd rounds: every chart's proxy normal is fixed to its current mean normal, its
+//      seed moved to its innermost triangle (farthest across edges from the chart's boundary),
+//      and all charts regrown at once from their seeds; what no chart takes gets charts of its own;
+//   3. merging: smallest charts first, a chart joins the neighbour it shares the longest linked
+//      boundary with when the union still keeps every normal within the normal limit of the
+//      union's mean normal and its curvature and size within the limits. Seams (unlinked edges)
+//      never merge. The flattening checks (stage 3) have the last word on merged charts.
+// Cost: O(T log T) a round; memory about 80 bytes a triangle.
 #pragma once
 
-#include "ChartMesh.h"
+#include "ChartGrowing.h"
 
-struct GrowLimits
-{
-    double cosHardAngle;
-    double areaDistortion;
-    double angleDistortion;
-    uint32_t maxTriangles;   // no chart grows beyond this many triangles
-};
+// Returns the number of charts, or kNoChart when scratch memory runs out.
+uint32_t SegmentCharts(const ChartMesh& mesh, const GrowRules& rules, uint32_t lloydRounds, uint32_t* chartOf);
 
-// Grows charts over the triangles whose chartOf is kNoChart, numbering them from firstChart on;
-// `queue` is scratch room for triCount entries. Returns the number after the last chart made.
-uint32_t GrowCharts(const ChartMesh& mesh, const GrowLimits& limits, uint32_t firstChart, uint32_t* chartOf, uint32_t* queue);
+// Renumbers charts 0, 1, ... in order of their lowest triangle (entries of kNoChart stay),
+// dropping unused numbers; chart numbers on entry are below `limit`. Returns the count, or kNoChart
+// when scratch memory runs out.
+uint32_t RenumberCharts(uint32_t* chartOf, uint32_t triCount, uint32_t limit);

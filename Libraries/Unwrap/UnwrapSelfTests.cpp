@@ -1,6 +1,7 @@
-// Unwrap.dll's self-test exports: they unwrap small meshes and check the chart layout's promises
-// (UVs inside the unit square, flat charts at their true shape at one common scale, one UV per
-// vertex inside a chart, charts apart).
+// Unwrap.dll's self-test exports: they unwrap small meshes with known answers and check the chart
+// layout's promises (UVs inside the unit square, flat and developable charts unrolled to their
+// true shape at one common scale, one UV per vertex inside a chart, degenerate triangles placed in
+// the chart holding their corners or apart, charts apart).
 #include "LibraryBehaviour.h"
 #include "UnwrapApi.h"
 #include "WinImports.h"
@@ -87,37 +88,93 @@ namespace
     }
 }
 
+// Twice the signed UV area of triangle t.
+static double TwiceUVArea(const float* uv, int32_t t)
+{
+    const float* c = uv + 6 * t;
+    return ((double)c[2] - c[0]) * ((double)c[5] - c[1]) - ((double)c[4] - c[0]) * ((double)c[3] - c[1]);
+}
+
+static bool SameUV(const float* a, const float* b) { return a[0] == b[0] && a[1] == b[1]; }
+
 static bool DegenerateTrianglesChecks()
 {
-    // A proper triangle, one with two coinciding positions, one with all three, one repeating an
-    // index: each degenerate one is a chart of its own, placed apart from the proper triangle.
-    const float vertex[] = {0, 0, 0, 2, 0, 0, 0, 1, 0, 3, 3, 3, 3, 3, 3, 4, 4, 4};
-    const uint32_t tri[] = {0, 1, 2, 3, 4, 5, 3, 4, 3, 1, 1, 2};
-    float uv[24];
-    if (!Unwrap(vertex, 6, tri, 4, uv) || !InsideUnitSquare(uv, 4))
+    // A 2 x 1 rectangle (triangles 0, 1) and four degenerate triangles: one repeating an index on
+    // the rectangle's edge 0-1 (2), one on the rectangle's corners 0, 1 and its own copy of corner 1
+    // (3), and two apart from it: three corners on a line (4) and three on one point (5).
+    const float vertex[] = {0, 0, 0, 2, 0, 0, 2, 1, 0, 0, 1, 0, 2, 0, 0, 5, 5, 5, 6, 5, 5, 7, 5, 5, 9, 9, 9};
+    const uint32_t tri[] = {0, 1, 2, 0, 2, 3, 0, 1, 1, 0, 1, 4, 5, 6, 7, 8, 8, 8};
+    float uv[36];
+    if (!Unwrap(vertex, 9, tri, 6, uv) || !InsideUnitSquare(uv, 6))
         return false;
+    // The rectangle is one chart at its true shape: a conformal map of a flat chart is a similarity.
     double scale = Distance2(uv, uv + 2) / 2.0;
-    bool pointStaysAPoint = uv[12] == uv[14] && uv[14] == uv[16] && uv[13] == uv[15] && uv[15] == uv[17];
-    Box proper = BoxOf(uv, 3);
-    for (int c = 3; c < 12; ++c)
-        if (!ApartFrom(proper, uv + 2 * c, kDefaults.packMargin))
+    if (!(scale > 0) || !KeepsShape(vertex, tri, uv, 0, scale) || !KeepsShape(vertex, tri, uv, 1, scale) ||
+        !OneUVPerVertex(tri, 2, uv) || !(TwiceUVArea(uv, 0) > 0) || !(TwiceUVArea(uv, 1) > 0))
+        return false;
+    // Triangle 2 sits in the rectangle's chart: its corners take the UVs of vertices 0 and 1 there.
+    if (!SameUV(uv + 12, uv) || !SameUV(uv + 14, uv + 2) || !SameUV(uv + 16, uv + 2))
+        return false;
+    // Triangle 3 has a corner (vertex 4) the chart does not hold: a chart of its own, with no area.
+    // So are triangles 4 and 5: every one of their corners keeps the margin from the rectangle.
+    Box rectangle = BoxOf(uv, 6);
+    for (int c = 9; c < 18; ++c)
+        if (!ApartFrom(rectangle, uv + 2 * c, kDefaults.packMargin))
             return false;
-    return scale > 0 && KeepsShape(vertex, tri, uv, 0, scale) && KeepsShape(vertex, tri, uv, 1, scale) && pointStaysAPoint;
+    bool lineStaysALine = fabs(TwiceUVArea(uv, 4)) < 1e-12 && fabs(TwiceUVArea(uv, 3)) < 1e-12;
+    bool pointStaysAPoint = SameUV(uv + 30, uv + 32) && SameUV(uv + 32, uv + 34);
+    return lineStaysALine && pointStaysAPoint;
 }
 
 static bool DontSplitRectsChecks()
 {
-    // A 2 x 1 rectangle as two triangles: one chart (the diagonal's corners share their UVs) at its
-    // true shape, turned square to the axes and as large as the margins allow.
-    const float vertex[] = {0, 0, 0, 2, 0, 0, 2, 1, 0, 0, 1, 0};
-    const uint32_t tri[] = {0, 1, 2, 0, 2, 3};
-    float uv[12];
-    if (!Unwrap(vertex, 4, tri, 2, uv) || !InsideUnitSquare(uv, 2) || !OneUVPerVertex(tri, 2, uv))
+    // A 4 x 1 strip of eight triangles bent into a third of a cylinder around the x axis (the
+    // strip's long side runs around it, normals 120 degrees apart at its ends): developable, so it
+    // stays one chart and unrolls to its true shape, every edge at one common scale within 1%.
+    const int steps = 4;
+    float vertex[3 * 2 * (steps + 1)];
+    uint32_t tri[3 * 2 * steps];
+    for (int i = 0; i <= steps; ++i)
+    {
+        const double arc = 2 * 3.14159265358979323846 / 3;
+        double angle = arc * i / steps, radius = 4 / arc;   // the arc is 4 long
+        for (int side = 0; side < 2; ++side)
+        {
+            float* p = vertex + 3 * (2 * i + side);
+            p[0] = (float)side;
+            p[1] = (float)(radius * cos(angle));
+            p[2] = (float)(radius * sin(angle));
+        }
+    }
+    for (uint32_t i = 0; i < (uint32_t)steps; ++i)
+    {
+        uint32_t a = 2 * i, b = 2 * i + 1, c = 2 * i + 3, d = 2 * i + 2;
+        const uint32_t quad[6] = {a, d, c, a, c, b};
+        memcpy(tri + 6 * i, quad, sizeof quad);
+    }
+    float uv[12 * steps];
+    if (!Unwrap(vertex, 2 * (steps + 1), tri, 2 * steps, uv) || !InsideUnitSquare(uv, 2 * steps) ||
+        !OneUVPerVertex(tri, 2 * steps, uv))
         return false;
-    double scale = Distance2(uv, uv + 2) / 2.0;
-    bool square = fabs((double)uv[0] - uv[2]) < 1e-6 || fabs((double)uv[1] - uv[3]) < 1e-6;
-    bool large = 2 * scale > 0.99 * (1 - 2 * kDefaults.packMargin);
-    return scale > 0 && KeepsShape(vertex, tri, uv, 0, scale) && KeepsShape(vertex, tri, uv, 1, scale) && square && large;
+    double scale = Distance2(uv, uv + 2) / Distance3(vertex + 3 * tri[0], vertex + 3 * tri[1]);
+    for (int t = 0; t < 2 * steps; ++t)
+        for (int c = 0; c < 3; ++c)
+        {
+            double length3 = Distance3(vertex + 3 * tri[3 * t + c], vertex + 3 * tri[3 * t + (c + 1) % 3]);
+            double length2 = Distance2(uv + 6 * t + 2 * c, uv + 6 * t + 2 * ((c + 1) % 3));
+            if (!(fabs(length2 - scale * length3) <= 0.01 * scale * length3) || !(TwiceUVArea(uv, t) > 0))
+                return false;
+        }
+    // A 2 x 1 rectangle of two triangles: one chart at its true shape, as large as packing allows
+    // (at best half the square).
+    const float flat[] = {0, 0, 0, 2, 0, 0, 2, 1, 0, 0, 1, 0};
+    const uint32_t pair[] = {0, 1, 2, 0, 2, 3};
+    float rect[12];
+    if (!Unwrap(flat, 4, pair, 2, rect) || !InsideUnitSquare(rect, 2) || !OneUVPerVertex(pair, 2, rect))
+        return false;
+    double rectScale = Distance2(rect, rect + 2) / 2.0;
+    return rectScale > 0 && KeepsShape(flat, pair, rect, 0, rectScale) && KeepsShape(flat, pair, rect, 1, rectScale) &&
+           2 * rectScale * rectScale > 0.4;
 }
 
 extern "C" bool Unwrap_TestUnwrapWithDegenerateTriangles()

@@ -1,0 +1,423 @@
+// Packing, orchestration (the contract is in AtlasPacking.h).
+//
+// 1. Group the triangles by chart; measure each chart's area and its starting orientation
+//    (PackOrientation); order the charts largest first.
+// 2. For a trial scale, pack every chart (PackRaster, PackPlacement) into a strip as wide as the
+//    atlas and twice as high, in each of 8 orientations (the minimum-area box one and its turns by
+//    45 degrees; 2 for charts under two texels), keeping the orientation with the lowest top.
+//    A trial within 5 % of the scale of the last such search keeps each chart's orientation and
+//    draws it once. The trial succeeds when the charts end within the atlas's height.
+// 3. Search the largest scale that succeeds: each trial's used height predicts the next scale,
+//    bounded by the best success and the smallest failure, until they are within 1 %.
+// 4. Move every corner to its chart's place.
+//
+// The margin: charts are drawn conservatively and dilated by whole texels covering half the
+// margin plus a slack for float rounding, and the atlas bitmap is inset by at least as much from
+// the square's border, so charts whose bitmaps share no texel are at least the margin apart and
+// from the border. The finished UVs are checked against the border once more.
+// Each trial costs the rows of every triangle in every orientation tried, plus the placement
+// searches (bounded, see PackPlacement.h); at most kMaxTrials trials.
+#include "AtlasPacking.h"
+
+#include "PackOrientation.h"
+#include "PackPlacement.h"
+#include "PackRaster.h"
+#include "Scratch.h"
+#include "UnwrapMath.h"
+#include "WinImports.h"
+
+namespace
+{
+    const char* const kOutOfMemory = "out of memory";
+    const char* const kDoesNotFit =
+        "the charts do not fit into the unit square with packMargin between them: use a smaller packMargin, or a mesh that "
+        "makes fewer charts";
+    const int kMaxTrials = 24;
+    const double kScaleTolerance = 1.01;   // the search stops when success and failure are this close
+    const int kOrientations = 8;
+    // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
+    const double kSlack = 1e-6;
+    // cos and sin of k * 45 degrees.
+    const double kTurnCos[8] = {1, 0.70710678118654752, 0, -0.70710678118654752, -1, -0.70710678118654752, 0, 0.70710678118654752};
+    const double kTurnSin[8] = {0, 0.70710678118654752, 1, 0.70710678118654752, 0, -0.70710678118654752, -1, -0.70710678118654752};
+
+    struct ChartInfo
+    {
+        double area;           // UV area in the input's units
+        double extent;         // the larger side of its bounding box
+        double cosine, sine;   // the minimum-area box turn
+    };
+
+    struct ChartPlace
+    {
+        double originX, originY;   // q of the chart raster's texel (0, 0)
+        uint32_t x, y;             // atlas texel of it
+        uint32_t orientation;
+    };
+
+    struct Layout
+    {
+        uint32_t atlasTexels;     // the atlas is atlasTexels wide and high
+        double inset;             // from the square's border to the atlas bitmap
+        double texel;
+        uint32_t dilationTexels;  // dilationTexels * texel >= margin / 2 + kSlack
+    };
+
+    // The trial result: all charts placed within `usedRows`, or the share of chart demand placed.
+    struct Trial
+    {
+        bool placedAll;
+        uint32_t usedRows;
+        double placedShare;
+    };
+
+    bool Finite(double v) { return v - v == 0; }
+
+    // Charts by decreasing area, ties by number: stable LSD radix sort on the float bits.
+    bool OrderLargestFirst(const ChartInfo* info, uint32_t n, uint32_t* order)
+    {
+        Scratch<uint32_t> keys, other, count;
+        if (!keys.Allocate(n) || !other.Allocate(n) || !count.Allocate(65537))
+            return false;
+        for (uint32_t c = 0; c < n; ++c)
+        {
+            float area = (float)info[c].area;
+            uint32_t bits;
+            memcpy(&bits, &area, 4);
+            keys[c] = 0x7FFFFFFFu - (bits & 0x7FFFFFFFu);
+            order[c] = c;
+        }
+        uint32_t* from = order;
+        uint32_t* to = other.Data();
+        for (int shift = 0; shift < 32; shift += 16)
+        {
+            memset(count.Data(), 0, 65537 * sizeof(uint32_t));
+            for (uint32_t i = 0; i < n; ++i)
+                ++count[((keys[from[i]] >> shift) & 0xFFFF) + 1];
+            for (uint32_t d = 0; d < 65536; ++d)
+                count[d + 1] += count[d];
+            for (uint32_t i = 0; i < n; ++i)
+                to[count[(keys[from[i]] >> shift) & 0xFFFF]++] = from[i];
+            uint32_t* swap = from;
+            from = to;
+            to = swap;
+        }
+        return true;   // two passes: the result is back in `order`
+    }
+
+    class Packer
+    {
+    public:
+        Packer(const float* uv, const uint32_t* start, const uint32_t* members, const ChartInfo* info, const uint32_t* order,
+               uint8_t* turn, uint32_t chartCount, const Layout& layout)
+            : m_UV(uv), m_Start(start), m_Members(members), m_Info(info), m_Order(order), m_Turn(turn), m_ChartCount(chartCount),
+              m_Layout(layout)
+        {
+        }
+
+        // Packs all charts at `scale` into places[]; false only when memory runs out. With
+        // `searchTurns` every orientation is tried; otherwise each chart keeps the orientation
+        // it had in the last such trial (the choice hardly changes with small scale steps).
+        bool Pack(double scale, bool searchTurns, ChartPlace* places, Trial* trial)
+        {
+            m_SearchTurns = searchTurns;
+            uint32_t n = m_Layout.atlasTexels;
+            if (!m_Atlas.Reset(n, 2 * n))
+                return false;
+            double demand = 0, placed = 0;
+            for (uint32_t i = 0; i < m_ChartCount; ++i)
+                demand += Demand(m_Order[i], scale);
+            for (uint32_t i = 0; i < m_ChartCount; ++i)
+            {
+                uint32_t c = m_Order[i];
+                bool memoryOut = false;
+                int best = PlaceBest(c, scale, &places[c], &memoryOut);
+                if (memoryOut)
+                    return false;
+                if (best < 0)
+                {
+                    *trial = {false, 2 * n, placed / demand};
+                    return true;
+                }
+                placed += Demand(c, scale);
+            }
+            *trial = {true, m_Atlas.top, 1};
+            return true;
+        }
+
+    private:
+        // A chart's share of atlas area, counting its dilation and a texel of rounding.
+        double Demand(uint32_t c, double scale) const
+        {
+            double side = Sqrt(m_Info[c].area) * scale + (2 * m_Layout.dilationTexels + 1) * m_Layout.texel;
+            return side * side;
+        }
+
+        // Tries the chart's orientations; places it at the best. Returns the orientation, or -1.
+        int PlaceBest(uint32_t c, double scale, ChartPlace* place, bool* memoryOut)
+        {
+            m_HoleBudget = kHoleSearchTrialBudget / m_ChartCount;
+            m_HoleBudget = m_HoleBudget < kHoleSearchChartBudget[0] ? kHoleSearchChartBudget[0] : m_HoleBudget;
+            m_HoleBudget = m_HoleBudget > kHoleSearchChartBudget[1] ? kHoleSearchChartBudget[1] : m_HoleBudget;
+            if (!m_SearchTurns)
+                return PlaceTurned(c, scale, (int)m_Turn[c], place, memoryOut);
+            const uint32_t* members = m_Members + m_Start[c];
+            uint32_t count = m_Start[c + 1] - m_Start[c];
+            int orientations = m_Info[c].extent * scale < 2 * m_Layout.texel ? 2 : kOrientations;
+            int step = kOrientations / orientations;
+            uint32_t bestTop = kNoTopLimit;
+            int best = -1;
+            Placement at = {0, 0};
+            for (int k = 0; k < kOrientations; k += step)
+            {
+                ChartRaster& raster = m_Raster[m_Current];
+                if (!RasterizeChart(m_UV, members, count, Pose(c, k, scale), m_Layout.atlasTexels, &raster))
+                {
+                    if (raster.outOfMemory)
+                        return (*memoryOut = true), -1;
+                    continue;   // too large for the atlas in this orientation
+                }
+                Placement candidate;
+                if (!FindPlacement(m_Atlas, raster, bestTop, &candidate, &m_HoleBudget))
+                    continue;
+                bestTop = candidate.y + raster.height;
+                best = k;
+                at = candidate;
+                m_Current ^= 1;   // keep this raster; draw the next orientation into the other
+            }
+            if (best < 0)
+                return -1;
+            const ChartRaster& chosen = m_Raster[m_Current ^ 1];
+            PlaceChart(m_Atlas, chosen, at);
+            *place = {chosen.originX, chosen.originY, at.x, at.y, (uint32_t)best};
+            m_Turn[c] = (uint8_t)best;
+            return best;
+        }
+
+        // Places the chart in orientation k only. Returns k, or -1 when it does not fit.
+        int PlaceTurned(uint32_t c, double scale, int k, ChartPlace* place, bool* memoryOut)
+        {
+            ChartRaster& raster = m_Raster[0];
+            if (!RasterizeChart(m_UV, m_Members + m_Start[c], m_Start[c + 1] - m_Start[c], Pose(c, k, scale),
+                                m_Layout.atlasTexels, &raster))
+                return (*memoryOut = raster.outOfMemory), -1;
+            Placement at;
+            if (!FindPlacement(m_Atlas, raster, kNoTopLimit, &at, &m_HoleBudget))
+                return -1;
+            PlaceChart(m_Atlas, raster, at);
+            *place = {raster.originX, raster.originY, at.x, at.y, (uint32_t)k};
+            return k;
+        }
+
+        RasterPose Pose(uint32_t c, int k, double scale) const
+        {
+            const ChartInfo& info = m_Info[c];
+            return {info.cosine * kTurnCos[k] - info.sine * kTurnSin[k], info.sine * kTurnCos[k] + info.cosine * kTurnSin[k],
+                    scale, m_Layout.texel, m_Layout.dilationTexels};
+        }
+
+        const float* m_UV;
+        const uint32_t* m_Start;
+        const uint32_t* m_Members;
+        const ChartInfo* m_Info;
+        const uint32_t* m_Order;
+        uint8_t* m_Turn;   // each chart's orientation from the last trial that searched them all
+        uint32_t m_ChartCount;
+        Layout m_Layout;
+        AtlasOccupancy m_Atlas;
+        ChartRaster m_Raster[2];
+        int m_Current = 0;
+        bool m_SearchTurns = true;
+        int64_t m_HoleBudget = 0;
+    };
+
+    // Triangles grouped by chart: members[start[c] .. start[c + 1]).
+    bool GroupCharts(const uint32_t* chartOf, uint32_t triCount, uint32_t chartCount, Scratch<uint32_t>& start,
+                     Scratch<uint32_t>& members)
+    {
+        if (!start.Allocate(chartCount + 1ull) || !members.Allocate(triCount ? triCount : 1))
+            return false;
+        memset(start.Data(), 0, (chartCount + 1ull) * 4);
+        for (uint32_t t = 0; t < triCount; ++t)
+            ++start[chartOf[t] + 1];
+        for (uint32_t c = 0; c < chartCount; ++c)
+            start[c + 1] += start[c];
+        for (uint32_t t = 0; t < triCount; ++t)
+            members[start[chartOf[t]]++] = t;
+        for (uint32_t c = chartCount; c > 0; --c)   // the fill moved every start one chart on
+            start[c] = start[c - 1];
+        start[0] = 0;
+        return true;
+    }
+
+    bool MeasureCharts(const float* uv, const uint32_t* start, const uint32_t* members, uint32_t chartCount, ChartInfo* info)
+    {
+        HullScratch hull;
+        for (uint32_t c = 0; c < chartCount; ++c)
+        {
+            double area = 0, minU = 1e300, minV = 1e300, maxU = -1e300, maxV = -1e300;
+            for (uint32_t i = start[c]; i < start[c + 1]; ++i)
+            {
+                const float* p = uv + 6ull * members[i];
+                area += Abs((p[2] - p[0]) * (double)(p[5] - p[1]) - (p[4] - p[0]) * (double)(p[3] - p[1])) / 2;
+                for (int k = 0; k < 6; k += 2)
+                {
+                    minU = p[k] < minU ? p[k] : minU, maxU = p[k] > maxU ? p[k] : maxU;
+                    minV = p[k + 1] < minV ? p[k + 1] : minV, maxV = p[k + 1] > maxV ? p[k + 1] : maxV;
+                }
+            }
+            info[c].area = area;
+            info[c].extent = maxU - minU > maxV - minV ? maxU - minU : maxV - minV;
+            if (!MinimumBoxTurn(uv, members + start[c], start[c + 1] - start[c], hull, &info[c].cosine, &info[c].sine))
+                return false;
+        }
+        return true;
+    }
+
+    // The atlas bitmap: about 1024 texels a side, more for many charts (whose dilated outlines
+    // then waste less of the margin), with the texel chosen so that a whole number of texels
+    // covers half the margin; what is left of the square's side goes into the inset.
+    Layout ChooseLayout(double margin, uint32_t chartCount)
+    {
+        double half = margin / 2 + kSlack;
+        uint32_t target = chartCount <= 1000 ? 1024 : (chartCount <= 8000 ? 2048 : 4096);
+        double plain = (1 - 2 * half) / target;
+        Layout layout;
+        layout.dilationTexels = half <= plain ? 1 : (uint32_t)(half / plain + 0.5);
+        layout.texel = half <= plain ? plain : half / layout.dilationTexels;
+        layout.atlasTexels = (uint32_t)((1 - 2 * half) / layout.texel);
+        while (layout.atlasTexels * layout.texel > 1 - 2 * half)
+            --layout.atlasTexels;
+        layout.inset = (1 - layout.atlasTexels * layout.texel) / 2;
+        return layout;
+    }
+
+    // The first scale to try: the charts' dilated squares fill 65 % of the atlas.
+    double FirstScale(const ChartInfo* info, uint32_t n, const Layout& layout)
+    {
+        double area = 0, roots = 0;
+        for (uint32_t c = 0; c < n; ++c)
+            area += info[c].area, roots += Sqrt(info[c].area);
+        double side = layout.atlasTexels * layout.texel, pad = (2 * layout.dilationTexels + 1) * layout.texel;
+        double target = 0.65 * side * side;
+        double a = area, b = 2 * pad * roots, c = n * pad * pad - target;
+        if (a <= 0)
+            return 1;
+        double disc = b * b - 4 * a * c;
+        double scale = c < 0 ? (-b + Sqrt(disc)) / (2 * a) : 0.01 * Sqrt(target / a);
+        return scale > 0 ? scale : 0.01 * Sqrt(target / a);
+    }
+
+    // The next scale to try, between the best success `low` (0: none yet) and the smallest
+    // failure `high` (0: none yet): the used height predicts the scale that just fits (area
+    // goes with the square of the scale); a failure undershoots a little, so that the search
+    // approaches from both sides.
+    double NextScale(double scale, const Trial& trial, uint32_t atlasTexels, double low, double high)
+    {
+        double guess;
+        if (trial.placedAll && trial.usedRows <= atlasTexels)
+        {
+            guess = scale * Sqrt((double)atlasTexels / (trial.usedRows ? trial.usedRows : 1));
+            guess = guess > scale * kScaleTolerance ? guess : scale * kScaleTolerance;
+        }
+        else if (trial.placedAll)
+            guess = scale * Sqrt((double)atlasTexels / trial.usedRows) * 0.985;
+        else
+            guess = scale * (trial.placedShare > 0 ? Sqrt(trial.placedShare / 2) : 0.5) * 0.985;
+        if (high > 0 && guess >= high)
+            guess = low > 0 ? Sqrt(low * high) : high * 0.97;
+        if (low > 0 && guess <= low)
+            guess = high > 0 ? Sqrt(low * high) : low * kScaleTolerance;
+        return guess;
+    }
+
+    void MoveCorners(float* uv, const uint32_t* chartOf, uint32_t triCount, const ChartInfo* info, const ChartPlace* places,
+                     double scale, const Layout& layout)
+    {
+        for (uint32_t t = 0; t < triCount; ++t)
+        {
+            const ChartInfo& chart = info[chartOf[t]];
+            const ChartPlace& place = places[chartOf[t]];
+            int k = (int)place.orientation;
+            double c = (chart.cosine * kTurnCos[k] - chart.sine * kTurnSin[k]) * scale;
+            double s = (chart.sine * kTurnCos[k] + chart.cosine * kTurnSin[k]) * scale;
+            double offsetX = layout.inset + place.x * layout.texel, offsetY = layout.inset + place.y * layout.texel;
+            for (uint32_t i = 6 * t; i < 6 * t + 6; i += 2)
+            {
+                double x = c * uv[i] - s * uv[i + 1] - place.originX, y = s * uv[i] + c * uv[i + 1] - place.originY;
+                uv[i] = (float)(x + offsetX);
+                uv[i + 1] = (float)(y + offsetY);
+            }
+        }
+    }
+
+    // The finished layout keeps the margin to the border (the gaps between charts hold by
+    // construction: their bitmaps share no texel).
+    bool InsideMargin(const float* uv, uint32_t triCount, double margin)
+    {
+        for (uint64_t i = 0; i < 6ull * triCount; ++i)
+            if (!(uv[i] >= margin && uv[i] <= 1 - margin))
+                return false;
+        return true;
+    }
+}
+
+bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t chartCount, double margin,
+               const char** error)
+{
+    if (!(margin >= 0 && margin < 0.5))
+        return (*error = "packMargin must be at least 0 and below 0.5"), false;
+    for (uint64_t i = 0; i < 6ull * triCount; ++i)
+        if (!Finite(uv[i]))
+            return (*error = "a flattened chart has a UV that is not a finite number"), false;
+    if (chartCount == 0)
+        return true;
+
+    Layout layout = ChooseLayout(margin, chartCount);
+
+    Scratch<uint32_t> start, members, order;
+    Scratch<ChartInfo> info;
+    Scratch<ChartPlace> trialPlaces, bestPlaces;
+    if (!GroupCharts(chartOf, triCount, chartCount, start, members) || !info.Allocate(chartCount) ||
+        !order.Allocate(chartCount) || !trialPlaces.Allocate(chartCount) || !bestPlaces.Allocate(chartCount) ||
+        !MeasureCharts(uv, start.Data(), members.Data(), chartCount, info.Data()) ||
+        !OrderLargestFirst(info.Data(), chartCount, order.Data()))
+        return (*error = kOutOfMemory), false;
+
+    double largest = 0;
+    for (uint32_t c = 0; c < chartCount; ++c)
+        largest = info[c].extent > largest ? info[c].extent : largest;
+    Scratch<uint8_t> turn;
+    if (!turn.Allocate(chartCount))
+        return (*error = kOutOfMemory), false;
+    Packer packer(uv, start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, layout);
+    double scale = FirstScale(info.Data(), chartCount, layout), low = 0, high = 0, turnsScale = 0;
+    for (int trialNumber = 0; trialNumber < kMaxTrials; ++trialNumber)
+    {
+        Trial trial;
+        bool searchTurns = turnsScale == 0 || scale > turnsScale * 1.05 || scale < turnsScale / 1.05;
+        turnsScale = searchTurns ? scale : turnsScale;
+        if (!packer.Pack(scale, searchTurns, trialPlaces.Data(), &trial))
+            return (*error = kOutOfMemory), false;
+        if (trial.placedAll && trial.usedRows <= layout.atlasTexels)
+        {
+            low = scale;
+            memcpy(bestPlaces.Data(), trialPlaces.Data(), (uint64_t)chartCount * sizeof(ChartPlace));
+        }
+        else
+        {
+            high = scale;
+            if (low == 0 && largest * scale < layout.texel / 8)
+                break;   // every chart is already a dot: no smaller scale makes room
+        }
+        if (low > 0 && high > 0 && high < low * kScaleTolerance)
+            break;
+        scale = NextScale(scale, trial, layout.atlasTexels, low, high);
+    }
+    if (low == 0)
+        return (*error = kDoesNotFit), false;
+    MoveCorners(uv, chartOf, triCount, info.Data(), bestPlaces.Data(), low, layout);
+    if (!InsideMargin(uv, triCount, margin))
+        return (*error = kDoesNotFit), false;
+    return true;
+}

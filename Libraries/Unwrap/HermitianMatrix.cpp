@@ -1,0 +1,69 @@
+#include "HermitianMatrix.h"
+
+#include "WinImports.h"
+
+bool HermitianMatrix::FromTriplets(uint32_t size, const uint32_t* rows, const MatrixEntry* triplets, uint64_t count)
+{
+    n = size;
+    if (!rowStart.Allocate(n + 1ull) || !entries.Allocate(count + 1) || !diag.Allocate(n + 1ull))
+        return false;
+    memset(rowStart.Data(), 0, (n + 1ull) * sizeof(uint32_t));
+    memset(diag.Data(), 0, (n + 1ull) * sizeof(double));
+    for (uint64_t k = 0; k < count; ++k)
+        if (rows[k] != triplets[k].column)
+            ++rowStart[rows[k] + 1];
+        else
+            diag[rows[k]] += triplets[k].laplace;
+    for (uint32_t i = 0; i < n; ++i)
+        rowStart[i + 1] += rowStart[i];
+    for (uint64_t k = 0; k < count; ++k)
+        if (rows[k] != triplets[k].column)
+            entries[rowStart[rows[k]]++] = triplets[k];
+    for (uint32_t i = n; i > 0; --i)
+        rowStart[i] = rowStart[i - 1];
+    rowStart[0] = 0;
+    // Sort every row by column (insertion: rows are short) and sum entries of one column.
+    uint32_t out = 0;
+    for (uint32_t i = 0; i < n; ++i)
+    {
+        uint32_t begin = rowStart[i], end = rowStart[i + 1];
+        for (uint32_t a = begin + 1; a < end; ++a)
+        {
+            MatrixEntry e = entries[a];
+            uint32_t b = a;
+            for (; b > begin && entries[b - 1].column > e.column; --b)
+                entries[b] = entries[b - 1];
+            entries[b] = e;
+        }
+        rowStart[i] = out;
+        for (uint32_t a = begin; a < end; ++a)
+        {
+            if (out > rowStart[i] && entries[out - 1].column == entries[a].column)
+            {
+                entries[out - 1].laplace += entries[a].laplace;
+                entries[out - 1].area += entries[a].area;
+            }
+            else
+                entries[out++] = entries[a];
+        }
+    }
+    rowStart[n] = out;
+    return true;
+}
+
+void HermitianMatrix::Multiply(const double* x, double* y) const
+{
+    for (uint32_t i = 0; i < n; ++i)
+    {
+        double yu = diag[i] * x[2 * i], yv = diag[i] * x[2 * i + 1];
+        for (uint32_t a = rowStart[i]; a < rowStart[i + 1]; ++a)
+        {
+            const MatrixEntry& e = entries[a];
+            double u = x[2 * e.column], v = x[2 * e.column + 1];
+            yu += e.laplace * u - e.area * v;
+            yv += e.area * u + e.laplace * v;
+        }
+        y[2 * i] = yu;
+        y[2 * i + 1] = yv;
+    }
+}

@@ -1,0 +1,74 @@
+// A binary min-heap of (cost, triangle, chart) entries with a fixed capacity, for chart growing.
+// Ties in cost go to the lower triangle, then the lower chart, so the order of pops is fully
+// determined by the entries (byte-identical runs).
+#pragma once
+
+#include "Scratch.h"
+
+#include <stdint.h>
+
+struct HeapEntry
+{
+    double cost;
+    uint32_t triangle, chart;
+};
+
+class MinHeap
+{
+public:
+    bool Allocate(uint64_t capacity)
+    {
+        m_Size = 0;
+        m_Capacity = capacity;
+        return m_Entries.Allocate(capacity ? capacity : 1);
+    }
+    bool Empty() const { return m_Size == 0; }
+    void Clear() { m_Size = 0; }
+
+    // False (and nothing pushed) when the heap is full.
+    bool Push(const HeapEntry& entry)
+    {
+        if (m_Size == m_Capacity)
+            return false;
+        uint64_t i = m_Size++;
+        while (i > 0 && Before(entry, m_Entries[(i - 1) / 2]))
+        {
+            m_Entries[i] = m_Entries[(i - 1) / 2];
+            i = (i - 1) / 2;
+        }
+        m_Entries[i] = entry;
+        return true;
+    }
+
+    HeapEntry Pop()
+    {
+        HeapEntry top = m_Entries[0], last = m_Entries[--m_Size];
+        uint64_t i = 0;
+        for (;;)
+        {
+            uint64_t child = 2 * i + 1;
+            if (child >= m_Size)
+                break;
+            if (child + 1 < m_Size && Before(m_Entries[child + 1], m_Entries[child]))
+                ++child;
+            if (!Before(m_Entries[child], last))
+                break;
+            m_Entries[i] = m_Entries[child];
+            i = child;
+        }
+        if (m_Size)
+            m_Entries[i] = last;
+        return top;
+    }
+
+private:
+    static bool Before(const HeapEntry& a, const HeapEntry& b)
+    {
+        if (a.cost != b.cost)
+            return a.cost < b.cost;
+        return a.triangle != b.triangle ? a.triangle < b.triangle : a.chart < b.chart;
+    }
+
+    Scratch<HeapEntry> m_Entries;
+    uint64_t m_Size = 0, m_Capacity = 0;
+};
