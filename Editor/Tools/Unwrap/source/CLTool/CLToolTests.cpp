@@ -2,6 +2,7 @@
 // libraries. CHARTBAKE_LIBRARY_BEHAVIOUR (read by the libraries) picks failing, warning,
 // crashing or announcing behaviour where a test needs it.
 #include "Runtime/Testing/ChildProcess.h"
+#include "Runtime/Testing/TemporaryDirectory.h"
 #include "Runtime/Testing/Testing.h"
 
 #include <algorithm>
@@ -66,30 +67,10 @@ namespace
         "f 1/1/1 2/1/1 3/1/1\n"
         "f 5/2/1 6/2/1 4/2/1 1/1/1\n";
 
-    struct ChartBakeFixture
+    struct ChartBakeFixture : Testing::TemporaryDirectory
     {
-        std::string dir;
+        ChartBakeFixture() : TemporaryDirectory("chartbake-e2e") {}
 
-        ChartBakeFixture()
-        {
-            char pattern[] = "/tmp/chartbake-e2e-XXXXXX";
-            dir = mkdtemp(pattern);
-        }
-        ~ChartBakeFixture() { std::filesystem::remove_all(dir); }
-
-        std::string PathOf(const std::string& name) const { return dir + "/" + name; }
-        void Write(const std::string& name, const std::string& bytes) const
-        {
-            std::ofstream(PathOf(name), std::ios::binary) << bytes;
-        }
-        std::string Read(const std::string& name) const
-        {
-            std::ifstream in(PathOf(name), std::ios::binary);
-            std::ostringstream text;
-            text << in.rdbuf();
-            return text.str();
-        }
-        bool Exists(const std::string& name) const { return std::filesystem::exists(PathOf(name)); }
         void CopyFromBin(const std::string& file, const std::string& as) const
         {
             std::filesystem::copy_file(kBinDir + "/" + file, PathOf(as));

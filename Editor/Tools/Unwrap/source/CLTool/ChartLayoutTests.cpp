@@ -4,6 +4,7 @@
 // distortion thresholds, sit inside the unit square with the margin around them, never overlap,
 // never flip a triangle, and share one texel density.
 #include "Runtime/Testing/ChildProcess.h"
+#include "Runtime/Testing/TemporaryDirectory.h"
 #include "Runtime/Testing/Testing.h"
 
 #include <algorithm>
@@ -215,24 +216,9 @@ namespace
         return "";
     }
 
-    struct ChartsFixture
+    struct ChartsFixture : Testing::TemporaryDirectory
     {
-        std::string dir;
-
-        ChartsFixture()
-        {
-            char pattern[] = "/tmp/chartbake-charts-XXXXXX";
-            dir = mkdtemp(pattern);
-        }
-        ~ChartsFixture() { std::filesystem::remove_all(dir); }
-
-        std::string Read(const std::string& name) const
-        {
-            std::ifstream in(dir + "/" + name, std::ios::binary);
-            std::ostringstream text;
-            text << in.rdbuf();
-            return text.str();
-        }
+        ChartsFixture() : TemporaryDirectory("chartbake-charts") {}
 
         // Unwraps `mesh` through the binary format; an empty layout when ChartBake fails.
         Layout Unwrap(const Mesh& mesh, const Params& params = Params(), const std::vector<uint32_t>& srcPoly = {}) const

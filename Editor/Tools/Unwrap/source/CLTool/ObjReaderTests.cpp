@@ -3,6 +3,7 @@
 // "v %f %f %f", "vt %f %f" and "f %u/%u/%*u ..."), under the driver's rounding toward zero.
 #include "Editor/Tools/Unwrap/source/CLTool/MeshFiles.h"
 #include "Editor/Tools/Unwrap/source/CLTool/ObjScanfReference.h"
+#include "Runtime/Testing/TemporaryDirectory.h"
 #include "Runtime/Testing/Testing.h"
 
 #include <cstdio>
@@ -37,29 +38,18 @@ namespace
         std::vector<uint32_t> Triangles() const { return std::vector<uint32_t>(tri, tri + 3 * (size_t)triCount); }
     };
 
-    struct ObjFileFixture
+    struct ObjFileFixture : Testing::TemporaryDirectory
     {
-        std::string dir;
         unsigned savedState = _mm_getcsr();
 
         // The driver's state while files are read: toward zero, flush-to-zero off.
-        ObjFileFixture()
-        {
-            char pattern[] = "/tmp/chartbake-obj-XXXXXX";
-            dir = mkdtemp(pattern);
-            _mm_setcsr((savedState | 0x6000u) & ~0x8000u);
-        }
-        ~ObjFileFixture()
-        {
-            _mm_setcsr(savedState);
-            std::filesystem::remove_all(dir);
-        }
+        ObjFileFixture() : TemporaryDirectory("chartbake-obj") { _mm_setcsr((savedState | 0x6000u) & ~0x8000u); }
+        ~ObjFileFixture() { _mm_setcsr(savedState); }
 
         std::string Write(const std::string& text) const
         {
-            std::string path = dir + "/mesh.obj";
-            std::ofstream(path, std::ios::binary) << text;
-            return path;
+            TemporaryDirectory::Write("mesh.obj", text);
+            return PathOf("mesh.obj");
         }
 
         void Load(const std::string& text, LoadedObj* obj) const

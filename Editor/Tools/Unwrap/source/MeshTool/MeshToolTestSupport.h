@@ -7,6 +7,7 @@
 #include "Editor/Tools/Unwrap/source/MeshTool/GltfLightmap.h"
 #include "Editor/Tools/Unwrap/source/MeshTool/GltfSceneExtract.h"
 #include "Runtime/Testing/ChildProcess.h"
+#include "Runtime/Testing/TemporaryDirectory.h"
 
 #include <cmath>
 #include <cstring>
@@ -24,31 +25,10 @@ namespace MeshToolTest
 
     inline bool Contains(const std::string& text, const std::string& part) { return text.find(part) != std::string::npos; }
 
-    struct MeshToolFixture
+    struct MeshToolFixture : Testing::TemporaryDirectory
     {
-        std::string dir;
+        MeshToolFixture() : TemporaryDirectory("chartbake-mesh-e2e") {}
 
-        MeshToolFixture()
-        {
-            char pattern[] = "/tmp/chartbake-mesh-e2e-XXXXXX";
-            dir = mkdtemp(pattern);
-        }
-        ~MeshToolFixture() { std::filesystem::remove_all(dir); }
-
-        std::string PathOf(const std::string& name) const { return dir + "/" + name; }
-        void Write(const std::string& name, const std::string& bytes) const
-        {
-            std::filesystem::create_directories(std::filesystem::path(PathOf(name)).parent_path());
-            std::ofstream(PathOf(name), std::ios::binary) << bytes;
-        }
-        std::string Read(const std::string& name) const
-        {
-            std::ifstream in(PathOf(name), std::ios::binary);
-            std::ostringstream text;
-            text << in.rdbuf();
-            return text.str();
-        }
-        bool Exists(const std::string& name) const { return std::filesystem::exists(PathOf(name)); }
         size_t FileCount() const
         {
             size_t count = 0;

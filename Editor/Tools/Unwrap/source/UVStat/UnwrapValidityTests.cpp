@@ -5,6 +5,7 @@
 #include "Editor/Tools/Unwrap/source/UVStat/TestMeshes.h"
 #include "Editor/Tools/Unwrap/source/UVStat/UVStat.h"
 #include "Runtime/Testing/ChildProcess.h"
+#include "Runtime/Testing/TemporaryDirectory.h"
 #include "Runtime/Testing/Testing.h"
 
 #include <cstdlib>
@@ -27,14 +28,11 @@ namespace
     // Runs ChartBake on `mesh` in a fresh directory (removed afterwards).
     UnwrapRun RunChartBake(const UVStat::TestMesh& mesh, const UVStat::TestParams& params)
     {
-        char pattern[] = "/tmp/chartbake-validity-XXXXXX";
-        std::string dir = mkdtemp(pattern);
-        UVStat::WriteBinaryMeshFile(dir + "/mesh.bin", mesh, params);
+        Testing::TemporaryDirectory dir("chartbake-validity");
+        UVStat::WriteBinaryMeshFile(dir.PathOf("mesh.bin"), mesh, params);
         UnwrapRun run;
-        run.process = Testing::RunProgram({std::string(CHARTBAKE_BIN_DIR) + "/ChartBake", "mesh.bin", "out.bin"}, dir);
-        std::ifstream in(dir + "/out.bin", std::ios::binary);
-        run.uvBytes.assign(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
-        std::filesystem::remove_all(dir);
+        run.process = Testing::RunProgram({std::string(CHARTBAKE_BIN_DIR) + "/ChartBake", "mesh.bin", "out.bin"}, dir.dir);
+        run.uvBytes = dir.Read("out.bin");
         if (run.uvBytes.size() == 24ull * mesh.TriCount())
         {
             run.uv.resize(6ull * mesh.TriCount());
