@@ -92,16 +92,17 @@ bool ChartGrower::BreaksAtCorner(uint32_t f, uint32_t c) const
     return false;
 }
 
+// The checks are pure: the cheap ones go first, the walk around f's corners last.
 bool ChartGrower::Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const
 {
-    if (BreaksAtCorner(f, c))
-        return false;
     const ChartProxy& proxy = m_Proxy[c];
     if (proxy.triangles >= rules.maxTriangles)
         return false;
     if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], proxy.normal) >= rules.cosNormalLimit))
         return false;
-    return Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit;
+    if (!(Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit))
+        return false;
+    return !BreaksAtCorner(f, c);
 }
 
 void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rules)

@@ -199,13 +199,14 @@ namespace
             double pq = DotN(p.Data(), q.Data(), m);
             if (!(pq > 0))
                 break;
-            double alpha = rz / pq;
+            double alpha = rz / pq, rr = 0;   // one pass: the same sums in the same order
             for (uint64_t i = 0; i < m; ++i)
             {
                 x[i] += alpha * p[i];
                 r[i] -= alpha * q[i];
+                rr += r[i] * r[i];
             }
-            if (DotN(r.Data(), r.Data(), m) <= stop)
+            if (rr <= stop)
                 break;
             incomplete.Apply(r.Data(), z.Data());
             double next = DotN(r.Data(), z.Data(), m);
