@@ -27,6 +27,13 @@ public:
         return m_Data != nullptr;
     }
 
+    // Gives the memory back before the array goes out of scope.
+    void Release()
+    {
+        Tessary_Deallocate(m_Data);
+        m_Data = nullptr;
+    }
+
     T* Data() { return m_Data; }
     T& operator[](uint64_t i) { return m_Data[i]; }
     const T& operator[](uint64_t i) const { return m_Data[i]; }
