@@ -13,12 +13,12 @@ namespace
 
 }
 
-bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
+bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf, uint64_t heapRoom)
 {
     m_Mesh = &mesh;
     m_ChartOf = chartOf;
     uint64_t T = mesh.triCount + 1ull;
-    if (!m_Heap.Allocate(3 * T + 16) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
+    if (!m_Heap.Allocate(heapRoom ? heapRoom : 3 * T + 16) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
         !m_Rejected.Allocate(T) || !m_Queued.Allocate(T))
         return false;
     memset(m_Queued.Data(), 0, mesh.triCount);
@@ -155,7 +155,8 @@ void ChartGrower::PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules)
             continue;
         uint32_t w = twin / 3;
         double cost = rules.geodesic ? m_Distance[t] + Length(Centroid(*m_Mesh, w) - Centroid(*m_Mesh, t)) : Cost(w, c, rules);
-        m_Heap.Push({cost, w, c});   // room for 3 a triangle added: each joins once a growth
+        if (!m_Heap.Push({cost, w, c}))
+            m_Failed = true;
     }
 }
 

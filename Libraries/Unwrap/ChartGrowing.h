@@ -55,8 +55,10 @@ public:
     ChartGrower& operator=(const ChartGrower&) = delete;
     ~ChartGrower() { Tessary_Deallocate(m_Proxy); }
 
-    // chartOf has one entry a triangle. Proxies grow with the chart numbers seeded.
-    bool Allocate(const ChartMesh& mesh, uint32_t* chartOf);
+    // chartOf has one entry a triangle. Proxies grow with the chart numbers seeded. The candidate
+    // heap starts with room for `heapRoom` entries (0: 3 a triangle of the mesh, all that growing
+    // the whole mesh ever needs) and doubles when full.
+    bool Allocate(const ChartMesh& mesh, uint32_t* chartOf, uint64_t heapRoom = 0);
 
     // Proxies of the charts seeded so far (numbers below the highest seeded + 1).
     ChartProxy* Proxies() { return m_Proxy; }
