@@ -69,9 +69,8 @@ namespace
                     continue;
                 }
                 ++stats->splits;
-                // The grower's memory is taken at the first split: most meshes never need it. Its
-                // heap starts at the size the split chart needs and grows if a later one needs more.
-                if (!m_GrowerReady && !(m_GrowerReady = m_Grower.Allocate(m_Mesh, m_ChartOf, 3ull * count + 16)))
+                // The grower's memory is taken at the first split: most meshes never need it.
+                if (!m_GrowerReady && !(m_GrowerReady = m_Grower.Allocate(m_Mesh, m_ChartOf)))
                     return false;
                 Split(r, seeds);
                 if (m_Grower.Failed())

@@ -13,12 +13,12 @@ namespace
 
 }
 
-bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf, uint64_t heapRoom)
+bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
 {
     m_Mesh = &mesh;
     m_ChartOf = chartOf;
     uint64_t T = mesh.triCount + 1ull;
-    if (!m_Heap.Allocate(heapRoom ? heapRoom : 3 * T + 16) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
+    if (!m_Heap.Allocate(1024) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
         !m_Rejected.Allocate(T) || !m_Queued.Allocate(T))
         return false;
     memset(m_Queued.Data(), 0, mesh.triCount);

@@ -56,9 +56,9 @@ public:
     ~ChartGrower() { Tessary_Deallocate(m_Proxy); }
 
     // chartOf has one entry a triangle. Proxies grow with the chart numbers seeded. The candidate
-    // heap starts with room for `heapRoom` entries (0: 3 a triangle of the mesh, all that growing
-    // the whole mesh ever needs) and doubles when full.
-    bool Allocate(const ChartMesh& mesh, uint32_t* chartOf, uint64_t heapRoom = 0);
+    // heap starts small and doubles when full: it holds a growing front (and entries gone stale),
+    // far fewer than the 3 a triangle that growing the whole mesh pushes in all.
+    bool Allocate(const ChartMesh& mesh, uint32_t* chartOf);
 
     // Proxies of the charts seeded so far (numbers below the highest seeded + 1).
     ChartProxy* Proxies() { return m_Proxy; }
