@@ -31,15 +31,8 @@ bool ChartGrower::Reserve(uint32_t chart)
         return true;
     uint64_t capacity = m_ProxyCapacity ? 2ull * m_ProxyCapacity : 256;
     capacity = capacity > chart ? capacity : chart + 1ull;
-    if (capacity * sizeof(ChartProxy) > 0xFFFFFFF0ull)
+    if (!m_Proxy.Grow(m_ProxyCapacity, capacity))
         return false;
-    ChartProxy* grown = (ChartProxy*)Tessary_Allocate((unsigned int)(capacity * sizeof(ChartProxy)));
-    if (!grown)
-        return false;
-    if (m_ProxyCapacity)
-        memcpy(grown, m_Proxy, m_ProxyCapacity * sizeof(ChartProxy));
-    Tessary_Deallocate(m_Proxy);
-    m_Proxy = grown;
     m_ProxyCapacity = (uint32_t)capacity;
     return true;
 }

@@ -53,7 +53,6 @@ public:
     ChartGrower() = default;
     ChartGrower(const ChartGrower&) = delete;
     ChartGrower& operator=(const ChartGrower&) = delete;
-    ~ChartGrower() { Tessary_Deallocate(m_Proxy); }
 
     // chartOf has one entry a triangle. Proxies grow with the chart numbers seeded. The candidate
     // heap starts small and doubles when full: it holds a growing front (and entries gone stale),
@@ -61,7 +60,7 @@ public:
     bool Allocate(const ChartMesh& mesh, uint32_t* chartOf);
 
     // Proxies of the charts seeded so far (numbers below the highest seeded + 1).
-    ChartProxy* Proxies() { return m_Proxy; }
+    ChartProxy* Proxies() { return m_Proxy.Data(); }
 
     // True once a proxy could not get memory: the growing since then is incomplete.
     bool Failed() const { return m_Failed; }
@@ -93,7 +92,7 @@ private:
     MinHeap m_Heap;
     bool Reserve(uint32_t chart);
 
-    ChartProxy* m_Proxy = nullptr;   // on Tessary's allocator, doubled as chart numbers grow
+    Scratch<ChartProxy> m_Proxy;   // doubled as chart numbers grow
     uint32_t m_ProxyCapacity = 0;
     bool m_Failed = false;
     Scratch<double> m_Distance;     // geodesic rules: each grown triangle's distance from its seed
