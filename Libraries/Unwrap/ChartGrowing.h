@@ -19,8 +19,9 @@
 // (srcPoly) join a chart whole: when one of their triangles joins, the rest of the polygon joins
 // with it, whatever the limits say.
 // Every order is decided by costs, then triangle numbers: runs are reproducible bit for bit.
-// Cost: O(n log n) for n triangles grown; memory 16 bytes a pushed candidate (at most 3 a triangle
-// and 3 a seed), 72 bytes a chart.
+// Cost: O(n log n) for n triangles grown; memory 17 bytes a triangle of the mesh, 16 bytes a
+// candidate queued at once (the growing fronts and stale entries; the heap doubles when full),
+// 72 bytes a chart.
 #pragma once
 
 #include "ChartMesh.h"
