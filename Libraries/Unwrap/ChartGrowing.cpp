@@ -18,7 +18,7 @@ bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
     m_Mesh = &mesh;
     m_ChartOf = chartOf;
     uint64_t T = mesh.triCount + 1ull;
-    if (!m_Heap.Allocate(3 * T + 16) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
+    if (!m_Heap.Allocate(1024) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
         !m_Rejected.Allocate(T) || !m_Queued.Allocate(T))
         return false;
     memset(m_Queued.Data(), 0, mesh.triCount);
@@ -31,15 +31,8 @@ bool ChartGrower::Reserve(uint32_t chart)
         return true;
     uint64_t capacity = m_ProxyCapacity ? 2ull * m_ProxyCapacity : 256;
     capacity = capacity > chart ? capacity : chart + 1ull;
-    if (capacity * sizeof(ChartProxy) > 0xFFFFFFF0ull)
+    if (!m_Proxy.Grow(m_ProxyCapacity, capacity))
         return false;
-    ChartProxy* grown = (ChartProxy*)Tessary_Allocate((unsigned int)(capacity * sizeof(ChartProxy)));
-    if (!grown)
-        return false;
-    if (m_ProxyCapacity)
-        memcpy(grown, m_Proxy, m_ProxyCapacity * sizeof(ChartProxy));
-    Tessary_Deallocate(m_Proxy);
-    m_Proxy = grown;
     m_ProxyCapacity = (uint32_t)capacity;
     return true;
 }
@@ -92,16 +85,17 @@ bool ChartGrower::BreaksAtCorner(uint32_t f, uint32_t c) const
     return false;
 }
 
+// The checks are pure: the cheap ones go first, the walk around f's corners last.
 bool ChartGrower::Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const
 {
-    if (BreaksAtCorner(f, c))
-        return false;
     const ChartProxy& proxy = m_Proxy[c];
     if (proxy.triangles >= rules.maxTriangles)
         return false;
     if (rules.cosNormalLimit >= -1 && !(Dot(m_Mesh->normal[f], proxy.normal) >= rules.cosNormalLimit))
         return false;
-    return Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit;
+    if (!(Abs(proxy.curvature + m_Mesh->curvature[f]) <= rules.curvatureLimit))
+        return false;
+    return !BreaksAtCorner(f, c);
 }
 
 void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rules)
@@ -154,7 +148,8 @@ void ChartGrower::PushNeighbours(uint32_t t, uint32_t c, const GrowRules& rules)
             continue;
         uint32_t w = twin / 3;
         double cost = rules.geodesic ? m_Distance[t] + Length(Centroid(*m_Mesh, w) - Centroid(*m_Mesh, t)) : Cost(w, c, rules);
-        m_Heap.Push({cost, w, c});   // room for 3 a triangle added: each joins once a growth
+        if (!m_Heap.Push({cost, w, c}))
+            m_Failed = true;
     }
 }
 

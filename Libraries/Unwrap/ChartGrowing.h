@@ -19,8 +19,9 @@
 // (srcPoly) join a chart whole: when one of their triangles joins, the rest of the polygon joins
 // with it, whatever the limits say.
 // Every order is decided by costs, then triangle numbers: runs are reproducible bit for bit.
-// Cost: O(n log n) for n triangles grown; memory 16 bytes a pushed candidate (at most 3 a triangle
-// and 3 a seed), 72 bytes a chart.
+// Cost: O(n log n) for n triangles grown; memory 17 bytes a triangle of the mesh, 16 bytes a
+// candidate queued at once (the growing fronts and stale entries; the heap doubles when full),
+// 72 bytes a chart.
 #pragma once
 
 #include "ChartMesh.h"
@@ -53,13 +54,14 @@ public:
     ChartGrower() = default;
     ChartGrower(const ChartGrower&) = delete;
     ChartGrower& operator=(const ChartGrower&) = delete;
-    ~ChartGrower() { Tessary_Deallocate(m_Proxy); }
 
-    // chartOf has one entry a triangle. Proxies grow with the chart numbers seeded.
+    // chartOf has one entry a triangle. Proxies grow with the chart numbers seeded. The candidate
+    // heap starts small and doubles when full: it holds a growing front (and entries gone stale),
+    // far fewer than the 3 a triangle that growing the whole mesh pushes in all.
     bool Allocate(const ChartMesh& mesh, uint32_t* chartOf);
 
     // Proxies of the charts seeded so far (numbers below the highest seeded + 1).
-    ChartProxy* Proxies() { return m_Proxy; }
+    ChartProxy* Proxies() { return m_Proxy.Data(); }
 
     // True once a proxy could not get memory: the growing since then is incomplete.
     bool Failed() const { return m_Failed; }
@@ -91,7 +93,7 @@ private:
     MinHeap m_Heap;
     bool Reserve(uint32_t chart);
 
-    ChartProxy* m_Proxy = nullptr;   // on Tessary's allocator, doubled as chart numbers grow
+    Scratch<ChartProxy> m_Proxy;   // doubled as chart numbers grow
     uint32_t m_ProxyCapacity = 0;
     bool m_Failed = false;
     Scratch<double> m_Distance;     // geodesic rules: each grown triangle's distance from its seed

@@ -13,7 +13,7 @@
 //      boundary with when the union still keeps every normal within the normal limit of the
 //      union's mean normal and its curvature and size within the limits. Seams (unlinked edges)
 //      never merge. The flattening checks (stage 3) have the last word on merged charts.
-// Cost: O(T log T) a round; memory about 80 bytes a triangle.
+// Cost: O(T log T) a round; memory about 30 bytes a triangle plus the grower's candidate heap.
 #pragma once
 
 #include "ChartGrowing.h"

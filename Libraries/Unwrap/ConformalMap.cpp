@@ -20,14 +20,17 @@ namespace
 
     // The conformal energy's matrix: per directed triangle edge a -> b with opposite corner k,
     // L gets w = cot(angle at k) / 2 on both diagonals and -w off them, B gets +1/2 at (a, b) and
-    // -1/2 at (b, a) (the area form).
+    // -1/2 at (b, a) (the area form). The diagonal is summed here, in triangle order, rather than
+    // passed as triplets: a third less scratch at the chart's peak, the same sums.
     bool BuildConformalMatrix(const ChartMesh& mesh, const uint32_t* triangles, uint32_t count, const uint32_t* corner,
                               uint32_t vertices, HermitianMatrix* h)
     {
         Scratch<uint32_t> rows;
         Scratch<MatrixEntry> triplets;
-        if (!rows.Allocate(12ull * count) || !triplets.Allocate(12ull * count))
+        Scratch<double> diagonal;
+        if (!rows.Allocate(6ull * count) || !triplets.Allocate(6ull * count) || !diagonal.Allocate(vertices + 1ull))
             return false;
+        memset(diagonal.Data(), 0, (vertices + 1ull) * sizeof(double));
         uint64_t k = 0;
         for (uint32_t i = 0; i < count; ++i)
             for (uint32_t c = 0; c < 3; ++c)
@@ -36,10 +39,10 @@ namespace
                 double w = 0.5 * Cotangent(mesh, triangles[i], (c + 2) % 3);
                 rows[k] = a, triplets[k++] = {b, -w, 0.5};
                 rows[k] = b, triplets[k++] = {a, -w, -0.5};
-                rows[k] = a, triplets[k++] = {a, w, 0};
-                rows[k] = b, triplets[k++] = {b, w, 0};
+                diagonal[a] += w;
+                diagonal[b] += w;
             }
-        return h->FromTriplets(vertices, rows.Data(), triplets.Data(), k);
+        return h->FromTriplets(vertices, rows.Data(), triplets.Data(), k, diagonal.Data());
     }
 
     // Incomplete Cholesky factor (no fill) of H seen as the complex Hermitian matrix L + iB acting
@@ -77,6 +80,9 @@ namespace
                 }
             }
             lowerStart[n] = k;
+            re.Release();   // the solves read only the packed factor
+            im.Release();
+            pivot.Release();
             return true;
         }
 
@@ -199,13 +205,14 @@ namespace
             double pq = DotN(p.Data(), q.Data(), m);
             if (!(pq > 0))
                 break;
-            double alpha = rz / pq;
+            double alpha = rz / pq, rr = 0;   // one pass: the same sums in the same order
             for (uint64_t i = 0; i < m; ++i)
             {
                 x[i] += alpha * p[i];
                 r[i] -= alpha * q[i];
+                rr += r[i] * r[i];
             }
-            if (DotN(r.Data(), r.Data(), m) <= stop)
+            if (rr <= stop)
                 break;
             incomplete.Apply(r.Data(), z.Data());
             double next = DotN(r.Data(), z.Data(), m);

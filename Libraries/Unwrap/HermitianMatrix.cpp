@@ -2,13 +2,16 @@
 
 #include "WinImports.h"
 
-bool HermitianMatrix::FromTriplets(uint32_t size, const uint32_t* rows, const MatrixEntry* triplets, uint64_t count)
+bool HermitianMatrix::FromTriplets(uint32_t size, const uint32_t* rows, const MatrixEntry* triplets, uint64_t count,
+                                   const double* diagonal)
 {
     n = size;
     if (!rowStart.Allocate(n + 1ull) || !entries.Allocate(count + 1) || !diag.Allocate(n + 1ull))
         return false;
     memset(rowStart.Data(), 0, (n + 1ull) * sizeof(uint32_t));
     memset(diag.Data(), 0, (n + 1ull) * sizeof(double));
+    if (diagonal)
+        memcpy(diag.Data(), diagonal, n * sizeof(double));
     for (uint64_t k = 0; k < count; ++k)
         if (rows[k] != triplets[k].column)
             ++rowStart[rows[k] + 1];

@@ -21,9 +21,11 @@ struct HermitianMatrix
     Scratch<MatrixEntry> entries;
     Scratch<double> diag;
 
-    // The matrix of `count` entries (rows[k], entries[k]) summed; entries on the diagonal add
-    // their real part to diag. False when scratch memory runs out.
-    bool FromTriplets(uint32_t size, const uint32_t* rows, const MatrixEntry* triplets, uint64_t count);
+    // The matrix of `count` entries (rows[k], entries[k]) summed; diag starts as `diagonal` (n
+    // values; zeros when null) and entries on the diagonal add their real part to it. False when
+    // scratch memory runs out.
+    bool FromTriplets(uint32_t size, const uint32_t* rows, const MatrixEntry* triplets, uint64_t count,
+                      const double* diagonal = nullptr);
 
     // y = A x (x, y interleaved pairs; they must not alias).
     void Multiply(const double* x, double* y) const;

@@ -25,11 +25,15 @@ public:
     bool Empty() const { return m_Size == 0; }
     void Clear() { m_Size = 0; }
 
-    // False (and nothing pushed) when the heap is full.
+    // Doubles the room when full; false (and nothing pushed) when that memory is out.
     bool Push(const HeapEntry& entry)
     {
         if (m_Size == m_Capacity)
-            return false;
+        {
+            if (!m_Entries.Grow(m_Size, 2 * m_Capacity + 16))
+                return false;
+            m_Capacity = 2 * m_Capacity + 16;
+        }
         uint64_t i = m_Size++;
         while (i > 0 && Before(entry, m_Entries[(i - 1) / 2]))
         {

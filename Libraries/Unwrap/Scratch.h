@@ -3,6 +3,7 @@
 #pragma once
 
 #include "../Tessary/TessaryApi.h"
+#include "WinImports.h"
 
 #include <stdint.h>
 
@@ -25,6 +26,28 @@ public:
             return false;
         m_Data = (T*)Tessary_Allocate((unsigned int)bytes);
         return m_Data != nullptr;
+    }
+
+    // Room for `count` elements, the first `keep` of them kept; false (the array unchanged) when
+    // memory is out.
+    bool Grow(uint64_t keep, uint64_t count)
+    {
+        uint64_t bytes = count * sizeof(T);
+        T* grown = bytes <= 0xFFFFFFF0ull ? (T*)Tessary_Allocate((unsigned int)bytes) : nullptr;
+        if (!grown)
+            return false;
+        if (keep)
+            memcpy(grown, m_Data, keep * sizeof(T));
+        Tessary_Deallocate(m_Data);
+        m_Data = grown;
+        return true;
+    }
+
+    // Gives the memory back before the array goes out of scope.
+    void Release()
+    {
+        Tessary_Deallocate(m_Data);
+        m_Data = nullptr;
     }
 
     T* Data() { return m_Data; }
