@@ -119,6 +119,9 @@ namespace
     public:
         uint64_t work = 0;   // rasterization and search steps so far: bounds the optional trials
 
+        // The skyline's choice (see AtlasOccupancy::minimizeWaste); Reset keeps it.
+        void SetMinimizeWaste(bool on) { m_Atlas.minimizeWaste = on; }
+
         Packer(const float* uv, const uint32_t* start, const uint32_t* members, const ChartInfo* info, const uint32_t* order,
                uint8_t* turn, uint32_t chartCount, const Layout& layout)
             : m_UV(uv), m_Start(start), m_Members(members), m_Info(info), m_Order(order), m_Turn(turn), m_ChartCount(chartCount),
@@ -412,8 +415,10 @@ namespace
 
         // Tries kRefineSteps scales in even steps above `from`, up to kRefineReach times it,
         // every orientation searched, while the work stays below workLimit; keeps the largest
-        // that fits.
-        bool Refine(Packer& packer, double from, uint64_t workLimit, double* bestScale) const
+        // that fits. Each scale is tried with the variants in turn (charts' order and the
+        // skyline's choice) until one fits: more different layouts for the same work.
+        bool Refine(Packer& packer, const ChartInfo* info, uint32_t* order, double from, uint64_t workLimit,
+                    double* bestScale) const
         {
             const double kRefineReach = 1.12;
             const int kRefineSteps = 24;
@@ -424,11 +429,20 @@ namespace
                 double scale = from * (1 + (kRefineReach - 1) * k / kRefineSteps);
                 if (scale <= *bestScale)
                     continue;
-                Trial trial;
-                if (!packer.Pack(scale, true, trialPlaces, &trial))
-                    return false;
-                if (Fits(trial))
-                    Keep(scale, bestScale);
+                for (int variant = 0; variant < 4 && packer.work < workLimit; ++variant)
+                {
+                    if (!OrderLargestFirst(info, chartCount, variant & 1 ? Order::ByExtent : Order::ByArea, order))
+                        return false;
+                    packer.SetMinimizeWaste(variant >= 2);
+                    Trial trial;
+                    if (!packer.Pack(scale, true, trialPlaces, &trial))
+                        return false;
+                    if (Fits(trial))
+                    {
+                        Keep(scale, bestScale);
+                        break;
+                    }
+                }
             }
             return true;
         }
@@ -498,15 +512,13 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     double first = FirstScale(info.Data(), chartCount, layout), low = 0;
     if (!search.Run(packer, first, kMaxTrials, ~0ull, &low))
         return (*error = kOutOfMemory), false;
-    // Then, within twice as much work again (at least 2 kExtraWork), the other order and scales above
+    // Then, within twice as much work again (at least 2, at most 4 kExtraWork), the other order and scales above
     // the best found: packing is not monotonic in the scale, least so with few charts.
-    uint64_t limit = packer.work + (packer.work > kExtraWork ? 2 * packer.work : 2 * kExtraWork);
-    double areaScale = low;
+    uint64_t extraWork = packer.work > kExtraWork ? 2 * packer.work : 2 * kExtraWork;
+    uint64_t limit = packer.work + (extraWork < 4 * kExtraWork ? extraWork : 4 * kExtraWork);
     if (!OrderLargestFirst(info.Data(), chartCount, Order::ByExtent, order.Data()) ||
-        !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low))
-        return (*error = kOutOfMemory), false;
-    if ((low == areaScale && !OrderLargestFirst(info.Data(), chartCount, Order::ByArea, order.Data())) ||
-        !search.Refine(packer, low, limit, &low))
+        !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
+        !search.Refine(packer, info.Data(), order.Data(), low, limit, &low))
         return (*error = kOutOfMemory), false;
     if (low == 0)
         return (*error = kDoesNotFit), false;
