@@ -9,14 +9,21 @@
 //    draws it once. The trial succeeds when the charts end within the atlas's height.
 // 3. Search the largest scale that succeeds: each trial's used height predicts the next scale,
 //    bounded by the best success and the smallest failure, until they are within 1 %.
-// 4. Move every corner to its chart's place.
+// 4. Packing is not monotonic in the scale (least so with few charts), so up to kExtraCharts
+//    charts there is more, within a work budget (Packer::work: at most twice the first search,
+//    and at least 2, at most 4 kExtraWork): a second search with the charts ordered by their
+//    longest side, then scales in 0.5 % steps above the best, each tried in turn with the two
+//    orders and the skyline's two choices (lowest, least waste) until one fits. The largest
+//    scale that fitted wins.
+// 5. Move every corner to its chart's place.
 //
 // The margin: charts are drawn conservatively and dilated by whole texels covering half the
 // margin plus a slack for float rounding, and the atlas bitmap is inset by at least as much from
 // the square's border, so charts whose bitmaps share no texel are at least the margin apart and
 // from the border. The finished UVs are checked against the border once more.
 // Each trial costs the rows of every triangle in every orientation tried, plus the placement
-// searches (bounded, see PackPlacement.h); at most kMaxTrials trials.
+// searches (bounded, see PackPlacement.h); at most kMaxTrials trials in the first search, then the
+// budget of step 4.
 #include "AtlasPacking.h"
 
 #include "PackOrientation.h"
@@ -33,6 +40,7 @@ namespace
         "the charts do not fit into the unit square with packMargin between them: use a smaller packMargin, or a mesh that "
         "makes fewer charts";
     const int kMaxTrials = 24;
+    const uint32_t kExtraCharts = 2000;     // more charts than this: no optional trials
     const uint64_t kExtraWork = 1u << 22;   // work units (see Packer::work) the optional trials may always spend
     const double kScaleTolerance = 1.01;   // the search stops when success and failure are this close
     const int kOrientations = 8;
@@ -119,6 +127,10 @@ namespace
     public:
         uint64_t work = 0;   // rasterization and search steps so far: bounds the optional trials
 
+        // Whether a trial stops as soon as a chart ends above the atlas (a failure then reports
+        // only the share placed, not the height used).
+        void SetStopAboveAtlas(bool on) { m_StopAboveAtlas = on; }
+
         // The skyline's choice (see AtlasOccupancy::minimizeWaste); Reset keeps it.
         void SetMinimizeWaste(bool on) { m_Atlas.minimizeWaste = on; }
 
@@ -154,6 +166,11 @@ namespace
                     return true;
                 }
                 placed += Demand(c, scale);
+                if (m_StopAboveAtlas && m_Atlas.top > n)
+                {
+                    *trial = {false, 2 * n, placed / demand};   // cannot fit any more: stop early
+                    return true;
+                }
             }
             *trial = {true, m_Atlas.top, 1};
             return true;
@@ -260,6 +277,7 @@ namespace
         ChartRaster m_Raster[2];
         int m_Current = 0;
         bool m_SearchTurns = true;
+        bool m_StopAboveAtlas = false;
         int64_t m_HoleBudget = 0;
     };
 
@@ -514,8 +532,11 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
         return (*error = kOutOfMemory), false;
     // Then, within twice as much work again (at least 2, at most 4 kExtraWork), the other order and scales above
     // the best found: packing is not monotonic in the scale, least so with few charts.
-    uint64_t extraWork = packer.work > kExtraWork ? 2 * packer.work : 2 * kExtraWork;
-    uint64_t limit = packer.work + (extraWork < 4 * kExtraWork ? extraWork : 4 * kExtraWork);
+    // Many charts pack evenly at any scale: they skip it.
+    uint64_t extraWork = packer.work > kExtraWork ? packer.work : kExtraWork;
+    extraWork = chartCount > kExtraCharts ? 0 : (extraWork < 2 * kExtraWork ? extraWork : 2 * kExtraWork);
+    uint64_t limit = packer.work + extraWork;
+    packer.SetStopAboveAtlas(true);
     if (!OrderLargestFirst(info.Data(), chartCount, Order::ByExtent, order.Data()) ||
         !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
         !search.Refine(packer, info.Data(), order.Data(), low, limit, &low))
