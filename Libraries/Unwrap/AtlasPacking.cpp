@@ -9,14 +9,21 @@
 //    draws it once. The trial succeeds when the charts end within the atlas's height.
 // 3. Search the largest scale that succeeds: each trial's used height predicts the next scale,
 //    bounded by the best success and the smallest failure, until they are within 1 %.
-// 4. Move every corner to its chart's place.
+// 4. Packing is not monotonic in the scale (least so with few charts), so up to kExtraCharts
+//    charts there is more, within a work budget (Packer::work: at most twice the first search,
+//    and at least 2, at most 4 kExtraWork): a second search with the charts ordered by their
+//    longest side, then scales in 0.5 % steps above the best, each tried in turn with the two
+//    orders and the skyline's two choices (lowest, least waste) until one fits. The largest
+//    scale that fitted wins.
+// 5. Move every corner to its chart's place.
 //
 // The margin: charts are drawn conservatively and dilated by whole texels covering half the
 // margin plus a slack for float rounding, and the atlas bitmap is inset by at least as much from
 // the square's border, so charts whose bitmaps share no texel are at least the margin apart and
 // from the border. The finished UVs are checked against the border once more.
 // Each trial costs the rows of every triangle in every orientation tried, plus the placement
-// searches (bounded, see PackPlacement.h); at most kMaxTrials trials.
+// searches (bounded, see PackPlacement.h); at most kMaxTrials trials in the first search, then the
+// budget of step 4.
 #include "AtlasPacking.h"
 
 #include "PackOrientation.h"
@@ -33,6 +40,8 @@ namespace
         "the charts do not fit into the unit square with packMargin between them: use a smaller packMargin, or a mesh that "
         "makes fewer charts";
     const int kMaxTrials = 24;
+    const uint32_t kExtraCharts = 2000;     // more charts than this: no optional trials
+    const uint64_t kExtraWork = 1u << 22;   // work units (see Packer::work) the optional trials may always spend
     const double kScaleTolerance = 1.01;   // the search stops when success and failure are this close
     const int kOrientations = 8;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
@@ -73,15 +82,23 @@ namespace
 
     bool Finite(double v) { return v - v == 0; }
 
-    // Charts by decreasing area, ties by number: stable LSD radix sort on the float bits.
-    bool OrderLargestFirst(const ChartInfo* info, uint32_t n, uint32_t* order)
+    // The orders tried: largest area first, and longest box side first (long strips then lie
+    // side by side before the compact charts fill the gaps).
+    enum class Order
+    {
+        ByArea,
+        ByExtent
+    };
+
+    // Charts by decreasing key, ties by number: stable LSD radix sort on the float bits.
+    bool OrderLargestFirst(const ChartInfo* info, uint32_t n, Order by, uint32_t* order)
     {
         Scratch<uint32_t> keys, other, count;
         if (!keys.Allocate(n) || !other.Allocate(n) || !count.Allocate(65537))
             return false;
         for (uint32_t c = 0; c < n; ++c)
         {
-            float area = (float)info[c].area;
+            float area = (float)(by == Order::ByArea ? info[c].area : info[c].extent);
             uint32_t bits;
             memcpy(&bits, &area, 4);
             keys[c] = 0x7FFFFFFFu - (bits & 0x7FFFFFFFu);
@@ -108,6 +125,15 @@ namespace
     class Packer
     {
     public:
+        uint64_t work = 0;   // rasterization and search steps so far: bounds the optional trials
+
+        // Whether a trial stops as soon as a chart ends above the atlas (a failure then reports
+        // only the share placed, not the height used).
+        void SetStopAboveAtlas(bool on) { m_StopAboveAtlas = on; }
+
+        // The skyline's choice (see AtlasOccupancy::minimizeWaste); Reset keeps it.
+        void SetMinimizeWaste(bool on) { m_Atlas.minimizeWaste = on; }
+
         Packer(const float* uv, const uint32_t* start, const uint32_t* members, const ChartInfo* info, const uint32_t* order,
                uint8_t* turn, uint32_t chartCount, const Layout& layout)
             : m_UV(uv), m_Start(start), m_Members(members), m_Info(info), m_Order(order), m_Turn(turn), m_ChartCount(chartCount),
@@ -140,6 +166,11 @@ namespace
                     return true;
                 }
                 placed += Demand(c, scale);
+                if (m_StopAboveAtlas && m_Atlas.top > n)
+                {
+                    *trial = {false, 2 * n, placed / demand};   // cannot fit any more: stop early
+                    return true;
+                }
             }
             *trial = {true, m_Atlas.top, 1};
             return true;
@@ -159,6 +190,14 @@ namespace
             m_HoleBudget = kHoleSearchTrialBudget / m_ChartCount;
             m_HoleBudget = m_HoleBudget < kHoleSearchChartBudget[0] ? kHoleSearchChartBudget[0] : m_HoleBudget;
             m_HoleBudget = m_HoleBudget > kHoleSearchChartBudget[1] ? kHoleSearchChartBudget[1] : m_HoleBudget;
+            int64_t budget = m_HoleBudget;
+            int best = PlaceInOrientations(c, scale, place, memoryOut);
+            work += (uint64_t)(budget - m_HoleBudget);
+            return best;
+        }
+
+        int PlaceInOrientations(uint32_t c, double scale, ChartPlace* place, bool* memoryOut)
+        {
             if (!m_SearchTurns)
                 return PlaceTurned(c, scale, (int)m_Turn[c], place, memoryOut);
             const uint32_t* members = m_Members + m_Start[c];
@@ -171,7 +210,9 @@ namespace
             for (int k = 0; k < kOrientations; k += step)
             {
                 ChartRaster& raster = m_Raster[m_Current];
-                if (!RasterizeChart(m_UV, members, count, Pose(c, k, scale), m_Layout.atlasTexels, &raster))
+                bool drawn = RasterizeChart(m_UV, members, count, Pose(c, k, scale), m_Layout.atlasTexels, &raster);
+                Account(raster, count);
+                if (!drawn)
                 {
                     if (raster.outOfMemory)
                         return (*memoryOut = true), -1;
@@ -198,8 +239,10 @@ namespace
         int PlaceTurned(uint32_t c, double scale, int k, ChartPlace* place, bool* memoryOut)
         {
             ChartRaster& raster = m_Raster[0];
-            if (!RasterizeChart(m_UV, m_Members + m_Start[c], m_Start[c + 1] - m_Start[c], Pose(c, k, scale),
-                                m_Layout.atlasTexels, &raster))
+            bool drawn = RasterizeChart(m_UV, m_Members + m_Start[c], m_Start[c + 1] - m_Start[c], Pose(c, k, scale),
+                                        m_Layout.atlasTexels, &raster);
+            Account(raster, m_Start[c + 1] - m_Start[c]);
+            if (!drawn)
                 return (*memoryOut = raster.outOfMemory), -1;
             Placement at;
             if (!FindPlacement(m_Atlas, raster, kNoTopLimit, &at, &m_HoleBudget))
@@ -207,6 +250,12 @@ namespace
             PlaceChart(m_Atlas, raster, at);
             *place = {raster.originX, raster.originY, at.x, at.y, (uint32_t)k};
             return k;
+        }
+
+        // The work of drawing a chart and searching its skyline, in the units of the hole budget.
+        void Account(const ChartRaster& raster, uint32_t triangles)
+        {
+            work += triangles + (uint64_t)raster.words * raster.height + raster.width;
         }
 
         RasterPose Pose(uint32_t c, int k, double scale) const
@@ -228,6 +277,7 @@ namespace
         ChartRaster m_Raster[2];
         int m_Current = 0;
         bool m_SearchTurns = true;
+        bool m_StopAboveAtlas = false;
         int64_t m_HoleBudget = 0;
     };
 
@@ -331,6 +381,91 @@ namespace
         return guess;
     }
 
+    // The search for the largest scale at which every chart fits; the best layout found by any
+    // run is kept in `best` with its scale.
+    struct ScaleSearch
+    {
+        ChartPlace* trialPlaces;
+        ChartPlace* best;
+        uint32_t chartCount;
+        double largest;   // the largest chart extent
+        Layout layout;
+
+        bool Fits(const Trial& trial) const { return trial.placedAll && trial.usedRows <= layout.atlasTexels; }
+
+        void Keep(double scale, double* bestScale) const
+        {
+            *bestScale = scale;
+            memcpy(best, trialPlaces, (uint64_t)chartCount * sizeof(ChartPlace));
+        }
+
+        // From `scale`, at most `trials` packs, each used height predicting the next scale;
+        // stops when success and failure are within kScaleTolerance or the packer's work reaches
+        // workLimit. False when memory runs out.
+        bool Run(Packer& packer, double scale, int trials, uint64_t workLimit, double* bestScale) const
+        {
+            double low = 0, high = 0, turnsScale = 0;
+            for (int trialNumber = 0; trialNumber < trials && packer.work < workLimit; ++trialNumber)
+            {
+                Trial trial;
+                bool searchTurns = turnsScale == 0 || scale > turnsScale * 1.05 || scale < turnsScale / 1.05;
+                turnsScale = searchTurns ? scale : turnsScale;
+                if (!packer.Pack(scale, searchTurns, trialPlaces, &trial))
+                    return false;
+                if (Fits(trial))
+                {
+                    low = scale;
+                    if (scale > *bestScale)
+                        Keep(scale, bestScale);
+                }
+                else
+                {
+                    high = scale;
+                    if (low == 0 && largest * scale < layout.texel / 8)
+                        break;   // every chart is already a dot: no smaller scale makes room
+                }
+                if (low > 0 && high > 0 && high < low * kScaleTolerance)
+                    break;
+                scale = NextScale(scale, trial, layout.atlasTexels, low, high);
+            }
+            return true;
+        }
+
+        // Tries kRefineSteps scales in even steps above `from`, up to kRefineReach times it,
+        // every orientation searched, while the work stays below workLimit; keeps the largest
+        // that fits. Each scale is tried with the variants in turn (charts' order and the
+        // skyline's choice) until one fits: more different layouts for the same work.
+        bool Refine(Packer& packer, const ChartInfo* info, uint32_t* order, double from, uint64_t workLimit,
+                    double* bestScale) const
+        {
+            const double kRefineReach = 1.12;
+            const int kRefineSteps = 24;
+            if (from <= 0)
+                return true;
+            for (int k = 1; k <= kRefineSteps && packer.work < workLimit; ++k)
+            {
+                double scale = from * (1 + (kRefineReach - 1) * k / kRefineSteps);
+                if (scale <= *bestScale)
+                    continue;
+                for (int variant = 0; variant < 4 && packer.work < workLimit; ++variant)
+                {
+                    if (!OrderLargestFirst(info, chartCount, variant & 1 ? Order::ByExtent : Order::ByArea, order))
+                        return false;
+                    packer.SetMinimizeWaste(variant >= 2);
+                    Trial trial;
+                    if (!packer.Pack(scale, true, trialPlaces, &trial))
+                        return false;
+                    if (Fits(trial))
+                    {
+                        Keep(scale, bestScale);
+                        break;
+                    }
+                }
+            }
+            return true;
+        }
+    };
+
     void MoveCorners(float* uv, const uint32_t* chartOf, uint32_t triCount, const ChartInfo* info, const ChartPlace* places,
                      double scale, const Layout& layout)
     {
@@ -381,7 +516,7 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     if (!GroupCharts(chartOf, triCount, chartCount, start, members) || !info.Allocate(chartCount) ||
         !order.Allocate(chartCount) || !trialPlaces.Allocate(chartCount) || !bestPlaces.Allocate(chartCount) ||
         !MeasureCharts(uv, start.Data(), members.Data(), chartCount, info.Data()) ||
-        !OrderLargestFirst(info.Data(), chartCount, order.Data()))
+        !OrderLargestFirst(info.Data(), chartCount, Order::ByArea, order.Data()))
         return (*error = kOutOfMemory), false;
 
     double largest = 0;
@@ -391,29 +526,21 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     if (!turn.Allocate(chartCount))
         return (*error = kOutOfMemory), false;
     Packer packer(uv, start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, layout);
-    double scale = FirstScale(info.Data(), chartCount, layout), low = 0, high = 0, turnsScale = 0;
-    for (int trialNumber = 0; trialNumber < kMaxTrials; ++trialNumber)
-    {
-        Trial trial;
-        bool searchTurns = turnsScale == 0 || scale > turnsScale * 1.05 || scale < turnsScale / 1.05;
-        turnsScale = searchTurns ? scale : turnsScale;
-        if (!packer.Pack(scale, searchTurns, trialPlaces.Data(), &trial))
-            return (*error = kOutOfMemory), false;
-        if (trial.placedAll && trial.usedRows <= layout.atlasTexels)
-        {
-            low = scale;
-            memcpy(bestPlaces.Data(), trialPlaces.Data(), (uint64_t)chartCount * sizeof(ChartPlace));
-        }
-        else
-        {
-            high = scale;
-            if (low == 0 && largest * scale < layout.texel / 8)
-                break;   // every chart is already a dot: no smaller scale makes room
-        }
-        if (low > 0 && high > 0 && high < low * kScaleTolerance)
-            break;
-        scale = NextScale(scale, trial, layout.atlasTexels, low, high);
-    }
+    ScaleSearch search = {trialPlaces.Data(), bestPlaces.Data(), chartCount, largest, layout};
+    double first = FirstScale(info.Data(), chartCount, layout), low = 0;
+    if (!search.Run(packer, first, kMaxTrials, ~0ull, &low))
+        return (*error = kOutOfMemory), false;
+    // Then, within twice as much work again (at least 2, at most 4 kExtraWork), the other order and scales above
+    // the best found: packing is not monotonic in the scale, least so with few charts.
+    // Many charts pack evenly at any scale: they skip it.
+    uint64_t extraWork = packer.work > kExtraWork ? packer.work : kExtraWork;
+    extraWork = chartCount > kExtraCharts ? 0 : (extraWork < 2 * kExtraWork ? extraWork : 2 * kExtraWork);
+    uint64_t limit = packer.work + extraWork;
+    packer.SetStopAboveAtlas(true);
+    if (!OrderLargestFirst(info.Data(), chartCount, Order::ByExtent, order.Data()) ||
+        !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
+        !search.Refine(packer, info.Data(), order.Data(), low, limit, &low))
+        return (*error = kOutOfMemory), false;
     if (low == 0)
         return (*error = kDoesNotFit), false;
     MoveCorners(uv, chartOf, triCount, info.Data(), bestPlaces.Data(), low, layout);

@@ -120,6 +120,23 @@ namespace
         return false;
     }
 
+    // A skyline position's cost: the texels it leaves empty under the chart plus the area up
+    // to its top across the chart's width (low and snug both count).
+    inline int64_t Score(bool minimizeWaste, int64_t y, uint32_t height, uint32_t w, int64_t waste)
+    {
+        return minimizeWaste ? (y + height) * (int64_t)w + waste : y;
+    }
+
+    // The texels left empty under a chart resting at y, on groups of g columns (an estimate).
+    inline int64_t GroupWaste(const int64_t* sky, const int64_t* bottom, uint32_t groups, uint32_t g, int64_t y)
+    {
+        int64_t waste = 0;
+        for (uint32_t j = 0; j < groups; ++j)
+            if (bottom[j] >= 0)
+                waste += (y + bottom[j] - sky[j]) * g;
+        return waste;
+    }
+
     // Skyline placement (see the header): false when the chart is wider than the atlas.
     bool SkylineSearch(const AtlasOccupancy& atlas, const ChartRaster& chart, Placement* at)
     {
@@ -144,7 +161,7 @@ namespace
             for (uint32_t b = j * perGroup; b < (j + 1) * perGroup && b < baseGroups; ++b)
                 sky[j] = atlas.skyGroup[b] > sky[j] ? atlas.skyGroup[b] : sky[j];
         }
-        int64_t bestY = -1;
+        int64_t bestScore = -1;
         uint32_t bestGroup = 0;
         for (uint32_t start = 0; start * g + w <= width; ++start)
         {
@@ -152,21 +169,28 @@ namespace
             for (uint32_t j = 0; j < groups; ++j)
                 if (bottom[j] >= 0 && sky[start + j] - bottom[j] > y)
                     y = sky[start + j] - bottom[j];
-            if (bestY < 0 || y < bestY)
-                bestY = y, bestGroup = start;
+            int64_t score = Score(atlas.minimizeWaste, y, chart.height, w,
+                                  atlas.minimizeWaste ? GroupWaste(sky + start, bottom, groups, g, y) : 0);
+            if (bestScore < 0 || score < bestScore)
+                bestScore = score, bestGroup = start;
         }
         // Exact resting heights around the best group's position.
         uint32_t from = bestGroup * g >= g - 1 ? bestGroup * g - (g - 1) : 0, to = bestGroup * g + (g - 1);
         to = to < width - w ? to : width - w;
-        bestY = -1;
+        int64_t bestY = -1;
+        bestScore = -1;
         for (uint32_t x = from; x <= to; ++x)
         {
-            int64_t y = 0;
+            int64_t y = 0, waste = 0;
             for (uint32_t j = 0; j < w; ++j)
                 if (chart.columnLow[j] != kNoRow && (int64_t)atlas.sky[x + j] - chart.columnLow[j] > y)
                     y = (int64_t)atlas.sky[x + j] - chart.columnLow[j];
-            if (bestY < 0 || y < bestY)
-                bestY = y, *at = {x, (uint32_t)y};
+            for (uint32_t j = 0; j < w && atlas.minimizeWaste; ++j)
+                if (chart.columnLow[j] != kNoRow)
+                    waste += y + chart.columnLow[j] - (int64_t)atlas.sky[x + j];
+            int64_t score = Score(atlas.minimizeWaste, y, chart.height, w, waste);
+            if (bestScore < 0 || score < bestScore)
+                bestScore = score, bestY = y, *at = {x, (uint32_t)y};
         }
         return bestY >= 0 && (uint64_t)bestY + chart.height <= atlas.rows;
     }

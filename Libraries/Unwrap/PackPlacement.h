@@ -3,7 +3,7 @@
 // none of its texels is taken. The lowest top edge wins, then the leftmost position.
 //
 // Two searches, both exact about the texels they accept:
-// - Skyline: every atlas column keeps the row above its highest taken texel; the chart rests on
+// - Skyline (the lowest position, or the least waste: see AtlasOccupancy::minimizeWaste): every atlas column keeps the row above its highest taken texel; the chart rests on
 //   it with its own lowest texel of each column (shapes interlock, holes below the skyline stay
 //   unused). Positions are first compared on columns grouped by g (at most 64 groups a chart,
 //   256 an atlas; g a multiple of a base group whose highest skyline the atlas keeps up to
@@ -35,6 +35,9 @@ struct AtlasOccupancy
     Scratch<uint32_t> skyGroup;                // the highest sky of each base group
     uint32_t lowestRowWithRun[65] = {};        // lowest row holding a free run of n texels, n <= 64
     uint32_t top = 0;                          // rows [top, rows) are empty
+    // The skyline's choice: the lowest position (false), or the least area up to the chart's
+    // top plus the texels left empty under it (true).
+    bool minimizeWaste = false;
 
     // An empty atlas; false when memory runs out.
     bool Reset(uint32_t atlasWidth, uint32_t atlasRows);
