@@ -10,8 +10,8 @@
 // 3. Search the largest scale that succeeds: each trial's used height predicts the next scale,
 //    bounded by the best success and the smallest failure, until they are within 1 %.
 // 4. Packing is not monotonic in the scale (least so with few charts), so up to kExtraCharts
-//    charts there is more, within a work budget (Packer::work: at most twice the first search,
-//    and at least 2, at most 4 kExtraWork): a second search with the charts ordered by their
+//    charts there is more, within a work budget (Packer::work: as much again as the first search,
+//    at most 2 kExtraWork): a second search with the charts ordered by their
 //    longest side, then scales in 0.5 % steps above the best, each tried in turn with the two
 //    orders and the skyline's two choices (lowest, least waste) until one fits. The largest
 //    scale that fitted wins.
@@ -41,7 +41,7 @@ namespace
         "makes fewer charts";
     const int kMaxTrials = 24;
     const uint32_t kExtraCharts = 2000;     // more charts than this: no optional trials
-    const uint64_t kExtraWork = 1u << 22;   // work units (see Packer::work) the optional trials may always spend
+    const uint64_t kExtraWork = 1u << 22;   // the optional trials spend at most twice this (see Packer::work)
     const double kScaleTolerance = 1.01;   // the search stops when success and failure are this close
     const int kOrientations = 8;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
@@ -530,11 +530,11 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     double first = FirstScale(info.Data(), chartCount, layout), low = 0;
     if (!search.Run(packer, first, kMaxTrials, ~0ull, &low))
         return (*error = kOutOfMemory), false;
-    // Then, within twice as much work again (at least 2, at most 4 kExtraWork), the other order and scales above
+    // Then, within as much work again (at most 2 kExtraWork), the other order and scales above
     // the best found: packing is not monotonic in the scale, least so with few charts.
     // Many charts pack evenly at any scale: they skip it.
-    uint64_t extraWork = packer.work > kExtraWork ? packer.work : kExtraWork;
-    extraWork = chartCount > kExtraCharts ? 0 : (extraWork < 2 * kExtraWork ? extraWork : 2 * kExtraWork);
+    // No floor: a mesh that packed in a few milliseconds never waits for the second search.
+    uint64_t extraWork = chartCount > kExtraCharts ? 0 : (packer.work < 2 * kExtraWork ? packer.work : 2 * kExtraWork);
     uint64_t limit = packer.work + extraWork;
     packer.SetStopAboveAtlas(true);
     if (!OrderLargestFirst(info.Data(), chartCount, Order::ByExtent, order.Data()) ||
