@@ -1,26 +1,11 @@
 #include "Editor/Tools/Unwrap/source/MeshTool/ChartStats.h"
 
+#include "Runtime/Utilities/UnionFind.h"
+
 #include <cmath>
 #include <cstring>
 #include <numeric>
 #include <unordered_map>
-
-namespace
-{
-    struct UnionFind
-    {
-        std::vector<uint32_t> parent;
-        explicit UnionFind(size_t n) : parent(n) { std::iota(parent.begin(), parent.end(), 0u); }
-        uint32_t Find(uint32_t x)
-        {
-            while (parent[x] != x)
-                x = parent[x] = parent[parent[x]];
-            return x;
-        }
-        void Join(uint32_t a, uint32_t b) { parent[Find(a)] = Find(b); }
-    };
-
-}
 
 uint64_t CornerKey(const float* position, const float* uv)
 {
@@ -69,7 +54,7 @@ ChartStats ComputeChartStats(const MeshScene& scene, const std::vector<CornerUVs
     for (size_t p = 0; p < scene.primitives.size(); ++p)
         for (uint32_t t = 0; t < scene.primitives[p].TriangleCount(); ++t)
         {
-            auto [it, added] = chartNumber.emplace(charts.Find((uint32_t)(first[p] + t)), stats.chartCount);
+            auto [it, added] = chartNumber.emplace(charts.Root((uint32_t)(first[p] + t)), stats.chartCount);
             if (added)
                 ++stats.chartCount;
             stats.chartOfTriangle[p].push_back(it->second);

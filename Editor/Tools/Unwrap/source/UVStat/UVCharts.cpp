@@ -1,6 +1,7 @@
 // Charts and seams: corners with the same vertex and the same UV are one key; triangles sharing
 // a key are in one chart. Cost: sorting the 3T corners and the 3T half-edges.
 #include "Editor/Tools/Unwrap/source/UVStat/UVStatParts.h"
+#include "Runtime/Utilities/UnionFind.h"
 
 #include <algorithm>
 #include <cmath>
@@ -20,23 +21,6 @@ namespace UVStat
             return bits;
         }
 
-        struct UnionFind
-        {
-            std::vector<uint32_t> parent;
-            explicit UnionFind(uint32_t n) : parent(n) { std::iota(parent.begin(), parent.end(), 0u); }
-            uint32_t Root(uint32_t i)
-            {
-                while (parent[i] != i)
-                    i = parent[i] = parent[parent[i]];
-                return i;
-            }
-            void Join(uint32_t a, uint32_t b)
-            {
-                a = Root(a), b = Root(b);
-                if (a != b)
-                    parent[a < b ? b : a] = a < b ? a : b;
-            }
-        };
 
         double EdgeLength(const LayoutView& layout, uint32_t a, uint32_t b)
         {
