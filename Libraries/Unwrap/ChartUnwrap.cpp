@@ -1,6 +1,7 @@
 #include "ChartUnwrap.h"
 
 #include "AtlasPacking.h"
+#include "ChartCutting.h"
 #include "ChartFlattening.h"
 #include "ChartSegmentation.h"
 #include "MeshPreparation.h"
@@ -39,7 +40,7 @@ bool UnwrapIntoCharts(const float* vertex, uint32_t vertexCount, const uint32_t*
     if (!chartOf.Allocate(triCount))
         return (*error = kOutOfMemory), false;
     uint32_t charts = SegmentCharts(mesh, RulesFrom(param), 3, chartOf.Data());
-    *stats = {charts, 0, 0, 0, 0};
+    *stats = {charts, 0, 0, 0, 0, 0};
     if (charts == kNoChart)
         return (*error = kOutOfMemory), false;
     FlattenStats flattening;
@@ -47,7 +48,11 @@ bool UnwrapIntoCharts(const float* vertex, uint32_t vertexCount, const uint32_t*
     charts = FlattenCharts(mesh, limits, charts, chartOf.Data(), outUV, &flattening);
     if (charts == kNoChart)
         return (*error = kOutOfMemory), false;
-    *stats = {stats->segmented, flattening.splits, charts, flattening.angleDistortion, flattening.areaDistortion};
+    CutStats cutting;
+    charts = CutCharts(mesh, charts, chartOf.Data(), outUV, &cutting);
+    if (charts == kNoChart)
+        return (*error = kOutOfMemory), false;
+    *stats = {stats->segmented, flattening.splits, charts, flattening.angleDistortion, flattening.areaDistortion, cutting.cuts};
     if (!PackAtlas(outUV, chartOf.Data(), triCount, charts, param.packMargin, error))
         return false;
     return CheckOutput(mesh, chartOf.Data(), outUV, error);

@@ -75,11 +75,11 @@ namespace
                       float* outUV, const UnwrapParam& param, char* buffer, uint32_t size)
     {
         const char* error = nullptr;
-        UnwrapStats stats = {0, 0, 0, 0, 0};
+        UnwrapStats stats = {0, 0, 0, 0, 0, 0};
         bool done = UnwrapIntoCharts(vertex, (uint32_t)vertexCount, tri, srcPoly, (uint32_t)triCount, param, outUV, &stats, &error);
         if (BehaviourRequested("unwrap-report-stats") && buffer && size)
-            sprintf_s(buffer, size, "segmented %u charts, %u splits, %u charts, angle distortion %.5f, area distortion %.5f\n",
-                      stats.segmented, stats.splits, stats.charts, stats.angleDistortion, stats.areaDistortion);
+            sprintf_s(buffer, size, "segmented %u charts, %u splits, %u charts, angle distortion %.5f, area distortion %.5f, %u cuts\n",
+                      stats.segmented, stats.splits, stats.charts, stats.angleDistortion, stats.areaDistortion, stats.cuts);
         if (done)
             return true;
         return Fail(buffer, size, error);

@@ -8,6 +8,7 @@
 #include "Runtime/Testing/TemporaryDirectory.h"
 #include "Runtime/Testing/Testing.h"
 
+#include <cmath>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
@@ -61,6 +62,38 @@ namespace
         if (!report.Valid())
             Testing::ReportFailureAtLine(line, (std::string(name) + ": invalid layout\n" + UVStat::FormatText(report)).c_str());
         return report;
+    }
+
+    // A flat grid of `along` x `across` cells of cellLength x 1, bent round an arc of `turn`
+    // radians (a straight strip for turn 0). From every `degenerateEvery`-th column (0: none), a
+    // zero-area triangle joins three vertices on one slanted line over four columns (sharing no
+    // edge with the grid, so the strip stays one surface); they start two columns before each
+    // multiple of `degenerateEvery`, so that a cut there would cross one.
+    UVStat::TestMesh Strip(uint32_t along, uint32_t across, double cellLength, double turn, uint32_t degenerateEvery = 0)
+    {
+        UVStat::TestMesh mesh;
+        double length = along * cellLength, radius = turn > 0 ? length / turn : 0;
+        for (uint32_t i = 0; i <= along; ++i)
+            for (uint32_t j = 0; j <= across; ++j)
+            {
+                double x = i * cellLength, y = j;
+                if (turn > 0)
+                {
+                    double angle = x / radius, r = radius + y;
+                    x = r * std::cos(angle), y = r * std::sin(angle);
+                }
+                mesh.Add(x, y, 0);
+            }
+        auto at = [across](uint32_t i, uint32_t j) { return i * (across + 1) + j; };
+        for (uint32_t i = 0; i < along; ++i)
+            for (uint32_t j = 0; j < across; ++j)
+            {
+                mesh.Face(at(i, j), at(i + 1, j), at(i + 1, j + 1));
+                mesh.Face(at(i, j), at(i + 1, j + 1), at(i, j + 1));
+            }
+        for (uint32_t i = degenerateEvery - 2; degenerateEvery && turn == 0 && i + 4 <= along; i += degenerateEvery)
+            mesh.Face(at(i, 0), at(i + 2, 1), at(i + 4, 2));
+        return mesh;
     }
 }
 
@@ -117,6 +150,53 @@ INTEGRATION_TEST_SUITE(UnwrapValidity)
         CHECK_EQUAL(1, run.process.exitStatus);
         CHECK(run.process.out.find("packMargin") != std::string::npos);
         CHECK(run.uv.empty());
+    }
+
+    // Charts too long for the square are cut across into pieces: a 48:1 strip covers under 4 %
+    // of the square whole, while its pieces stack; every piece keeps its flat, exact shape.
+    TEST(ALongStripIsCutIntoPiecesThatFillTheSquare)
+    {
+        UVStat::Report strip = CheckUnwrapIsValid("strip", Strip(576, 3, 0.25, 0), __LINE__);
+        CHECK(strip.quality.charts >= 4);
+        CHECK(strip.quality.utilization > 0.3);
+        CHECK(strip.quality.chartAreaDistortion < 1e-3);
+        CHECK(strip.quality.vertexSplit < 1.05);
+    }
+
+    TEST(ALongArcIsCutIntoPiecesThatStayValid)
+    {
+        // Three quarters of a ring, 2 wide and about 150 long.
+        UVStat::Report arc = CheckUnwrapIsValid("arc", Strip(600, 2, 0.25, 4.7), __LINE__);
+        CHECK(arc.quality.charts >= 2);
+        CHECK(arc.quality.utilization > 0.15);
+    }
+
+    TEST(CutsKeepEveryDegenerateTriangleWithItsVertices)
+    {
+        // Zero-area triangles span four columns each: a cut between their ends would leave them
+        // with vertices in two pieces that the packing then moves apart. (uvstat counts such a
+        // triangle, whose UVs are collinear only up to float rounding, as overlapping the
+        // triangles under it, so that one check is left out here.)
+        UVStat::TestMesh mesh = Strip(576, 3, 0.25, 0, 16);
+        uint32_t firstDegenerate = 2 * 576 * 3;
+        UnwrapRun run = RunChartBake(mesh, UVStat::TestParams());
+        CHECK_EQUAL(0, run.process.exitStatus);
+        if (run.uv.empty())
+            return;
+        UVStat::Report report = MeasureRun(mesh, run, UVStat::TestParams().packMargin);
+        const UVStat::Validity& v = report.validity;
+        CHECK_EQUAL(0u, v.nonFiniteCorners + v.outsideCorners + v.flipped + v.zeroArea);
+        CHECK_EQUAL(0u, v.overlapPairsBetweenCharts + v.rasterOverlapBetweenCharts + v.rasterOverlapInsideCharts);
+        CHECK_EQUAL(0u, v.marginViolations + v.borderViolations + v.splitVertexCharts);
+        CHECK(report.quality.charts >= 4);
+        CHECK(report.quality.utilization > 0.3);
+        // Each keeps its 3D length (sqrt 5) at the layout's one scale.
+        double scale = std::sqrt(report.quality.utilization / (576 * 0.25 * 3));
+        for (uint32_t t = firstDegenerate; t < mesh.TriCount(); ++t)
+        {
+            double dx = run.uv[6 * t + 4] - run.uv[6 * t], dy = run.uv[6 * t + 5] - run.uv[6 * t + 1];
+            CHECK_CLOSE(std::sqrt(5.0) * scale, std::sqrt(dx * dx + dy * dy), 1e-3 * scale);
+        }
     }
 
     TEST(RepeatedRunsWriteIdenticalBytes)
