@@ -10,18 +10,22 @@ namespace
 {
     const uint32_t kMaxCuts = 12;
     const uint32_t kMinTriangles = 16;   // smaller charts are never cut
-    const uint32_t kMaxPieces = 4;       // pieces one cut may leave (the far side of a cut may branch)
+    const uint32_t kMaxPieces = 2;       // pieces a cut leaves (a level whose far side branches is not used)
     const uint32_t kLevels = 8;          // cut levels tried: 1/8 .. 7/8 of the chart's length
     // The share of the charts' boxes' area that the packing covers, for the estimate; charts that
     // fill their box pack about this densely.
     const double kPackDensity = 0.8;
-    const double kMinGain = 1.05;     // a cut must raise the estimated utilization by this factor
+    // A cut must raise the estimated utilization by this factor (n cuts together by its
+    // sqrt(n)-th power, see Move): the estimate is rough, and smaller gains often vanish in the
+    // packing.
+    const double kMinGain = 1.08;
     // Seams cost vertices: a cut must raise the estimate by at least kSeamPrice times the share
     // of the mesh's vertices it splits (a cut that adds 1 % to the vertex split must bring 4 %
     // more utilization), and all cuts together split at most kSeamShare of the vertices.
-    const double kSeamPrice = 4;
-    const double kSeamShare = 0.03;
+    const double kSeamPrice = 6;
+    const double kSeamShare = 0.06;
     const double kSqrtHalf = 0.70710678118654752;
+    const uint32_t kSmoothing = 4;    // passes smoothing a cut (see Sides)
     const uint32_t kMaxGroup = 6;     // charts cut together at most (see BestGroup)
 
     struct Shape
@@ -53,24 +57,30 @@ namespace
         uint32_t needChart;
     };
 
+    // The estimated utilization. A square barely larger than the longest chart's need holds
+    // few other charts beside it, so the two bounds on its area add up softly (the root of
+    // their squares) rather than the larger one alone deciding.
     double Estimate(double area, double box, double need)
     {
-        double side2 = need * need > box / kPackDensity ? need * need : box / kPackDensity;
+        double byNeed = need * need, byBox = box / kPackDensity;
+        double side2 = Sqrt(byNeed * byNeed + byBox * byBox);
         return side2 > 0 ? area / side2 : 0;
     }
 
-    // x^(1/n) for x > 0 and small n, by bisection (no pow in the library).
-    double Root(double x, uint32_t n)
+    // The natural logarithm of x > 0: x = m 2^k with m in [0.75, 1.5), then the series of
+    // 2 artanh((m - 1) / (m + 1)) (no log in the library).
+    double Ln(double x)
     {
-        double low = x < 1 ? x : 1, high = x < 1 ? 1 : x;
-        for (int i = 0; i < 60; ++i)
-        {
-            double mid = 0.5 * (low + high), power = 1;
-            for (uint32_t k = 0; k < n; ++k)
-                power *= mid;
-            (power < x ? low : high) = mid;
-        }
-        return 0.5 * (low + high);
+        const double ln2 = 0.69314718055994531;
+        double k = 0;
+        for (; x >= 1.5; x *= 0.5)
+            k += 1;
+        for (; x < 0.75; x *= 2)
+            k -= 1;
+        double y = (x - 1) / (x + 1), y2 = y * y, term = y, sum = 0;
+        for (int i = 1; i < 40; i += 2, term *= y2)
+            sum += term / i;
+        return k * ln2 + 2 * sum;
     }
 
     uint32_t Bits(uint8_t mask) { return (mask & 1) + ((mask >> 1) & 1) + ((mask >> 2) & 1) + ((mask >> 3) & 1); }
@@ -87,7 +97,7 @@ namespace
             uint64_t T = m_Mesh.triCount, V = m_Mesh.vertexCount, C = chartCount + kMaxCuts * (kMaxPieces - 1ull);
             m_ChartCount = chartCount;
             return m_Members.Allocate(T) && m_Order.Allocate(T) && m_Queue.Allocate(T) && m_Piece.Allocate(T) &&
-                   m_Dist.Allocate(T) && m_Mask.Allocate(V) && m_Out.Allocate(4 * V) && m_Ranges.Allocate(C + 1) &&
+                   m_Dist.Allocate(T) && m_Side.Allocate(T) && m_Mask.Allocate(V) && m_Out.Allocate(4 * V) && m_Ranges.Allocate(C + 1) &&
                    m_Shapes.Allocate(C) && m_Plans.Allocate(C) && m_Heap.Allocate(1024);
         }
 
@@ -113,7 +123,7 @@ namespace
                 Move move = BestSingle(totals, budget - stats->seamVertices);
                 Move group = BestGroup(totals, top, found, budget - stats->seamVertices, kMaxCuts - stats->cuts);
                 move = group.score > move.score ? group : move;
-                if (move.score < kMinGain)
+                if (move.score < Ln(kMinGain))
                     break;
                 for (uint32_t i = 0; i < move.count; ++i)
                 {
@@ -129,7 +139,11 @@ namespace
         uint32_t ChartCount() const { return m_ChartCount; }
 
     private:
-        // Cuts to make together: the estimate's gain per cut (the count-th root of the gain).
+        // Cuts to make together, scored by the logarithm of the estimate's gain over the root of
+        // their count: a move is made when the score reaches ln(kMinGain), so n cuts together
+        // must raise the estimate by kMinGain^sqrt(n): more than one cut alone, less than n
+        // separate ones (cutting one of several equally long charts pays nothing until all of
+        // them are cut).
         struct Move
         {
             double score;
@@ -151,8 +165,8 @@ namespace
             for (uint32_t c = 0; c < m_ChartCount; ++c)
             {
                 double gain = CanCut(c, seamLeft) ? Gain(totals, c, m_Plans[c].pieces, m_Plans[c].piece) : 0;
-                if (gain > best.score && Pays(gain, m_Plans[c].seam))
-                    best = {gain, 1, {c}};
+                if (gain > 0 && Ln(gain) > best.score && Pays(gain, m_Plans[c].seam))
+                    best = {Ln(gain), 1, {c}};
             }
             return best;
         }
@@ -179,7 +193,7 @@ namespace
                 }
                 double rest = j + 1 < found ? m_Shapes[top[j + 1]].need : 0;
                 double gain = Estimate(totals.area, box, need > rest ? need : rest) / before;
-                double score = Root(gain, j + 1);
+                double score = gain > 0 ? Ln(gain) / Sqrt(j + 1.0) : 0;
                 if (score > best.score && Pays(gain, seam))
                 {
                     best = {score, j + 1, {}};
@@ -348,10 +362,32 @@ namespace
             return farthest;
         }
 
+        // m_Side: which side of the level each non-degenerate triangle of the chart lies on, the
+        // cut then smoothed: a triangle with two or three linked neighbours on the other side
+        // changes sides (kSmoothing passes). On meshes of long thin triangles the level alone
+        // zigzags through them and splits several times the vertices a straight cut would.
+        void Sides(uint32_t chart, const Range& r, double level)
+        {
+            for (uint32_t i = r.begin; i < r.end; ++i)
+                m_Side[m_Members[i]] = m_Dist[m_Members[i]] < level;
+            for (uint32_t pass = 0; pass < kSmoothing; ++pass)
+                for (uint32_t i = r.begin; i < r.end; ++i)
+                {
+                    uint32_t t = m_Members[i], other = 0;
+                    for (uint32_t h = 3 * t; h < 3 * t + 3 && !m_Mesh.degenerate[t]; ++h)
+                    {
+                        uint32_t u = Neighbour(chart, h);
+                        other += u != kNoChart && m_Side[u] != m_Side[t];
+                    }
+                    m_Side[t] = other >= 2 ? !m_Side[t] : m_Side[t];
+                }
+        }
+
         // Numbers the connected parts of the chart's non-degenerate triangles on either side of
         // the level (m_Piece); returns how many, or 0 when more than kMaxPieces.
         uint32_t Components(uint32_t chart, const Range& r, double level)
         {
+            Sides(chart, r, level);
             for (uint32_t i = r.begin; i < r.end; ++i)
                 m_Piece[m_Members[i]] = kNoChart;
             uint32_t pieces = 0;
@@ -362,7 +398,7 @@ namespace
                     continue;
                 if (pieces == kMaxPieces)
                     return 0;
-                bool near = m_Dist[seed] < level;
+                uint8_t near = m_Side[seed];
                 uint32_t head = 0, tail = 0;
                 m_Piece[seed] = pieces;
                 m_Queue[tail++] = seed;
@@ -372,7 +408,7 @@ namespace
                     for (uint32_t h = 3 * t; h < 3 * t + 3; ++h)
                     {
                         uint32_t u = Neighbour(chart, h);
-                        if (u != kNoChart && m_Piece[u] == kNoChart && (m_Dist[u] < level) == near)
+                        if (u != kNoChart && m_Piece[u] == kNoChart && m_Side[u] == near)
                             m_Piece[u] = pieces, m_Queue[tail++] = u;
                     }
                 }
@@ -595,7 +631,7 @@ namespace
         uint32_t m_ChartCount = 0;
         Scratch<uint32_t> m_Members, m_Order, m_Queue, m_Piece;
         Scratch<double> m_Dist;
-        Scratch<uint8_t> m_Mask, m_Out;
+        Scratch<uint8_t> m_Mask, m_Out, m_Side;
         Scratch<Range> m_Ranges;
         Scratch<Shape> m_Shapes;
         Scratch<Plan> m_Plans;

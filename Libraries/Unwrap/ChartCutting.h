@@ -4,24 +4,29 @@
 // Input: chartOf and outUV as FlattenCharts leaves them (charts 0 .. chartCount-1, each flattened
 // in mesh units and valid: no flip, no self-overlap, within the distortion limits; degenerate
 // triangles in a chart that holds their three vertices, or in a chart of their own).
-// Output: chartOf with charts 0 .. (returned count)-1; outUV is not touched. A piece keeps its
-// UVs, and a piece of a valid chart is valid as long as it is one piece, so every cut piece is:
+// Output: chartOf with charts 0 .. (returned count)-1; outUV is not touched. A cut leaves two
+// pieces that keep their UVs, and a piece of a valid chart is valid as long as it is one piece,
+// so every piece is:
 //   - connected across linked edges, and does not touch itself (no vertex has two separate fans
 //     of it, checked per piece);
 //   - whole in source polygons (linked triangles of one srcPoly are never separated);
 //   - holding all three vertices of each of its degenerate triangles.
 // Which cuts: the stage estimates the utilization the packing reaches, A / S^2 with A the charts'
-// area and S^2 the larger of (a) the square that the most demanding chart needs on its own (its
-// minimum-area box, straight or turned by 45 degrees) and (b) the charts' box areas over a
-// packing density. A cut runs across a chart along a level of the distance from one end of the
-// chart (the end found by two sweeps over the chart's triangles, distances between triangle
-// centres in UV), so that it crosses strips and arcs where they are narrowest in effect; levels at
-// 1/8 .. 7/8 of the chart's length are tried and the best kept. Cuts are taken greedily, the one
-// that raises the estimate most first, only while each raises it by at least kMinGain and the new
-// seam vertices stay within a share of the mesh's vertices; at most kMaxCuts cuts.
-// Cost: per chart considered, two shortest-path sweeps (O(n log n)) and seven labellings with a
-// minimum-area box each (O(n) plus the hulls); charts that cannot raise the estimate enough even
-// if they packed perfectly are never considered. Memory about 30 bytes a triangle.
+// area and S^2 a soft sum (root of the squares) of (a) the square that the most demanding chart
+// needs on its own (its minimum-area box, straight or turned by 45 degrees) and (b) the charts'
+// box areas over a packing density. A cut runs across a chart along a level of a coordinate along
+// it: the position along the long side of its minimum-area box (straight strips) or the path
+// distance from one end of the chart (found by two sweeps over its triangles, distances between
+// triangle centres in UV), which follows arcs; levels at 1/8 .. 7/8 of the coordinate's range
+// are tried, each smoothed so that it does not zigzag, and the best for the chart kept. Cuts are
+// taken greedily, the move that raises the estimate most first: one chart, or the charts that
+// need the largest squares together (cutting one of several equally long charts changes
+// nothing). A move of n cuts is made only while it raises the estimate by kMinGain^sqrt(n) and
+// by kSeamPrice times the share of vertices its seam splits, all cuts within kSeamShare of the
+// vertices and kMaxCuts.
+// Cost: per chart considered, two shortest-path sweeps (O(n log n)) and fourteen labellings with
+// a minimum-area box each (O(n) plus the hulls); charts that cannot raise the estimate enough even
+// if they filled their box are never considered. Memory about 30 bytes a triangle.
 #pragma once
 
 #include "ChartMesh.h"
