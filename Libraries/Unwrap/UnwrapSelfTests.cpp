@@ -126,6 +126,47 @@ static bool DegenerateTrianglesChecks()
     return lineStaysALine && pointStaysAPoint;
 }
 
+// A flat 60 x 1 strip of unit rectangles, each one source polygon of two triangles: far too
+// long for the square, so it is cut into pieces, but only between rectangles: both triangles of
+// each rectangle share the UVs of its diagonal, and every edge keeps its length at one scale.
+static bool LongStripOfRectsChecks()
+{
+    const uint32_t rects = 60;
+    float vertex[3 * 2 * (rects + 1)];
+    uint32_t tri[6 * rects], polygon[2 * rects];
+    for (uint32_t i = 0; i <= rects; ++i)
+        for (uint32_t side = 0; side < 2; ++side)
+        {
+            float* p = vertex + 3 * (2 * i + side);
+            p[0] = (float)i, p[1] = (float)side, p[2] = 0;
+        }
+    for (uint32_t i = 0; i < rects; ++i)
+    {
+        uint32_t a = 2 * i, b = 2 * i + 2, c = 2 * i + 3, d = 2 * i + 1;
+        const uint32_t quad[6] = {a, b, c, a, c, d};
+        memcpy(tri + 6 * i, quad, sizeof quad);
+        polygon[2 * i] = polygon[2 * i + 1] = 1000 + i;
+    }
+    float uv[12 * rects];
+    char error[256];
+    memset(error, 0, sizeof error);
+    if (!GenerateSecondaryUVSet(vertex, 2 * (rects + 1), nullptr, tri, polygon, 2 * rects, uv, kDefaults, error, sizeof error) ||
+        error[0] != 0 || !InsideUnitSquare(uv, 2 * rects))
+        return false;
+    double scale = Distance2(uv, uv + 2);
+    bool cut = false;
+    for (uint32_t i = 0; i < rects; ++i)
+    {
+        const float* first = uv + 12 * i;
+        const float* second = first + 6;
+        if (!SameUV(first, second) || !SameUV(first + 4, second + 2) || !KeepsShape(vertex, tri, uv, 2 * i, scale) ||
+            !KeepsShape(vertex, tri, uv, 2 * i + 1, scale))
+            return false;
+        cut = cut || (i > 0 && !SameUV(first, uv + 12 * (i - 1) + 2));   // a: corner b of the rectangle before
+    }
+    return cut;
+}
+
 static bool DontSplitRectsChecks()
 {
     // A 4 x 1 strip of eight triangles bent into a third of a cylinder around the x axis (the
@@ -174,7 +215,7 @@ static bool DontSplitRectsChecks()
         return false;
     double rectScale = Distance2(rect, rect + 2) / 2.0;
     return rectScale > 0 && KeepsShape(flat, pair, rect, 0, rectScale) && KeepsShape(flat, pair, rect, 1, rectScale) &&
-           2 * rectScale * rectScale > 0.4;
+           2 * rectScale * rectScale > 0.4 && LongStripOfRectsChecks();
 }
 
 extern "C" bool Unwrap_TestUnwrapWithDegenerateTriangles()
