@@ -11,7 +11,7 @@ namespace
     const uint32_t kMaxCuts = 12;
     const uint32_t kMinTriangles = 16;   // smaller charts are never cut
     const uint32_t kMaxPieces = 2;       // pieces a cut leaves (a level whose far side branches is not used)
-    const uint32_t kLevels = 8;          // cut levels tried: 1/8 .. 7/8 of the chart's length
+    const uint32_t kLevels = 6;          // cut levels tried: 1/6 .. 5/6 of the chart's length
     // The share of the charts' boxes' area that the packing covers, for the estimate; charts that
     // fill their box pack about this densely.
     const double kPackDensity = 0.8;
@@ -98,7 +98,7 @@ namespace
             m_ChartCount = chartCount;
             return m_Members.Allocate(T) && m_Order.Allocate(T) && m_Queue.Allocate(T) && m_Piece.Allocate(T) &&
                    m_Dist.Allocate(T) && m_Side.Allocate(T) && m_Mask.Allocate(V) && m_Out.Allocate(4 * V) && m_Ranges.Allocate(C + 1) &&
-                   m_Shapes.Allocate(C) && m_Plans.Allocate(C) && m_Heap.Allocate(1024);
+                   m_Shapes.Allocate(C) && m_Turn.Allocate(2 * C) && m_Plans.Allocate(C) && m_Heap.Allocate(1024);
         }
 
         bool Run(CutStats* stats)
@@ -108,7 +108,7 @@ namespace
             for (uint32_t c = 0; c < m_ChartCount; ++c)
             {
                 m_Plans[c].done = false;
-                if (!Measure(m_Members.Data() + m_Ranges[c].begin, m_Ranges[c].end - m_Ranges[c].begin, &m_Shapes[c]))
+                if (!MeasureChart(c))
                     return false;
             }
             uint32_t budget = (uint32_t)(kSeamShare * m_Mesh.vertexCount);
@@ -255,29 +255,55 @@ namespace
                 m_Members[ranges[m_ChartOf[t]].end++] = t;
         }
 
-        bool Measure(const uint32_t* triangles, uint32_t count, Shape* shape)
+        // The shape of triangles[0, count): its box is the smallest of four, turned from the
+        // frame (cosine, sine) by 0, 22.5, 45 and 67.5 degrees (a pass over the corners, where
+        // the exact minimum-area box would sort them for every trial cut). In a chart's own
+        // minimum-area frame the first is that box.
+        Shape Measure(const uint32_t* triangles, uint32_t count, double cosine, double sine) const
         {
-            double cosine, sine;
-            if (!MinimumBoxTurn(m_UV, triangles, count, m_Hull, &cosine, &sine))
-                return false;
-            double x0 = 1e300, x1 = -1e300, y0 = 1e300, y1 = -1e300, area = 0;
+            const double turnCos[4] = {1, 0.92387953251128676, kSqrtHalf, 0.38268343236508977};
+            const double turnSin[4] = {0, 0.38268343236508977, kSqrtHalf, 0.92387953251128676};
+            double axisX[4], axisY[4], low[8], high[8], area = 0;
+            for (uint32_t k = 0; k < 4; ++k)
+            {
+                axisX[k] = cosine * turnCos[k] - sine * turnSin[k];
+                axisY[k] = sine * turnCos[k] + cosine * turnSin[k];
+                low[2 * k] = low[2 * k + 1] = 1e300, high[2 * k] = high[2 * k + 1] = -1e300;
+            }
             for (uint32_t i = 0; i < count; ++i)
             {
                 const float* p = m_UV + 6ull * triangles[i];
                 area += 0.5 * Abs(((double)p[2] - p[0]) * ((double)p[5] - p[1]) - ((double)p[3] - p[1]) * ((double)p[4] - p[0]));
-                for (uint32_t k = 0; k < 6; k += 2)
-                {
-                    double x = cosine * p[k] - sine * p[k + 1], y = sine * p[k] + cosine * p[k + 1];
-                    x0 = x < x0 ? x : x0;
-                    x1 = x > x1 ? x : x1;
-                    y0 = y < y0 ? y : y0;
-                    y1 = y > y1 ? y : y1;
-                }
+                for (uint32_t c = 0; c < 6; c += 2)
+                    for (uint32_t k = 0; k < 4; ++k)
+                    {
+                        double x = axisX[k] * p[c] - axisY[k] * p[c + 1], y = axisY[k] * p[c] + axisX[k] * p[c + 1];
+                        low[2 * k] = x < low[2 * k] ? x : low[2 * k], high[2 * k] = x > high[2 * k] ? x : high[2 * k];
+                        low[2 * k + 1] = y < low[2 * k + 1] ? y : low[2 * k + 1];
+                        high[2 * k + 1] = y > high[2 * k + 1] ? y : high[2 * k + 1];
+                    }
             }
-            double w = x1 - x0, h = y1 - y0;
-            double longer = w > h ? w : h, shorter = w > h ? h : w;
-            double diagonal = (longer + shorter) * kSqrtHalf;
-            *shape = {area, w * h, diagonal < longer ? diagonal : longer};
+            Shape shape = {area, 1e300, 1e300};
+            for (uint32_t k = 0; k < 4 && count; ++k)
+            {
+                double w = high[2 * k] - low[2 * k], h = high[2 * k + 1] - low[2 * k + 1];
+                double longer = w > h ? w : h, shorter = w > h ? h : w;
+                double diagonal = (longer + shorter) * kSqrtHalf;
+                shape.box = w * h < shape.box ? w * h : shape.box;
+                shape.need = diagonal < shape.need ? diagonal : shape.need;
+                shape.need = longer < shape.need ? longer : shape.need;
+            }
+            return count ? shape : Shape{0, 0, 0};
+        }
+
+        // Chart c's minimum-area frame (m_Turn) and shape; false when memory runs out.
+        bool MeasureChart(uint32_t c)
+        {
+            const uint32_t* triangles = m_Members.Data() + m_Ranges[c].begin;
+            uint32_t count = m_Ranges[c].end - m_Ranges[c].begin;
+            if (!MinimumBoxTurn(m_UV, triangles, count, m_Hull, &m_Turn[2 * c], &m_Turn[2 * c + 1]))
+                return false;
+            m_Shapes[c] = Measure(triangles, count, m_Turn[2 * c], m_Turn[2 * c + 1]);
             return true;
         }
 
@@ -516,8 +542,8 @@ namespace
                     return false;
             }
             double cosine = 1, sine = 0;
-            if (kind == 0 && !LongAxis(r, &cosine, &sine))
-                return false;
+            if (kind == 0)
+                LongAxis(chart, r, &cosine, &sine);
             for (uint32_t i = r.begin; i < r.end; ++i)
             {
                 uint32_t t = m_Members[i];
@@ -538,16 +564,14 @@ namespace
         }
 
         // The turn whose u axis runs along the long side of the chart's minimum-area box.
-        bool LongAxis(const Range& r, double* cosine, double* sine)
+        void LongAxis(uint32_t chart, const Range& r, double* cosine, double* sine) const
         {
-            const uint32_t* triangles = m_Members.Data() + r.begin;
-            if (!MinimumBoxTurn(m_UV, triangles, r.end - r.begin, m_Hull, cosine, sine))
-                return false;
+            *cosine = m_Turn[2 * chart], *sine = m_Turn[2 * chart + 1];
             double x0 = 1e300, x1 = -1e300, y0 = 1e300, y1 = -1e300;
-            for (uint32_t i = 0; i < r.end - r.begin; ++i)
+            for (uint32_t i = r.begin; i < r.end; ++i)
                 for (uint32_t k = 0; k < 6; k += 2)
                 {
-                    const float* p = m_UV + 6ull * triangles[i] + k;
+                    const float* p = m_UV + 6ull * m_Members[i] + k;
                     double x = *cosine * p[0] - *sine * p[1], y = *sine * p[0] + *cosine * p[1];
                     x0 = x < x0 ? x : x0, x1 = x > x1 ? x : x1, y0 = y < y0 ? y : y0, y1 = y > y1 ? y : y1;
                 }
@@ -556,7 +580,6 @@ namespace
                 double c = *cosine;
                 *cosine = -*sine, *sine = c;
             }
-            return true;
         }
 
         // The chart's best cut among the coordinates and levels tried, by the estimate for its
@@ -581,14 +604,21 @@ namespace
                     return false;
                 for (uint32_t k = 1; k < kLevels && high > low; ++k)
                 {
-                    Plan trial = {true, kind, low + (high - low) * k / kLevels, 0, 0, {}};
+                    // A level that is not allowed (it would part a degenerate triangle or a source
+                    // polygon, or pinch a piece) is moved a little either way.
+                    Plan trial = {true, kind, 0, 0, 0, {}};
                     uint32_t start[kMaxPieces + 1];
-                    trial.pieces = Label(chart, r, trial.level, &trial.seam, start);
+                    for (uint32_t nudge = 0; nudge < 3 && !trial.pieces; ++nudge)
+                    {
+                        const double offset[3] = {0, 0.25, -0.25};
+                        trial.level = low + (high - low) * (k + offset[nudge]) / kLevels;
+                        trial.pieces = Label(chart, r, trial.level, &trial.seam, start);
+                    }
                     double box = 0, need = 0;
                     for (uint32_t p = 0; p < trial.pieces; ++p)
                     {
-                        if (!Measure(m_Order.Data() + start[p], start[p + 1] - start[p], &trial.piece[p]))
-                            return false;
+                        trial.piece[p] = Measure(m_Order.Data() + start[p], start[p + 1] - start[p], m_Turn[2 * chart],
+                                                 m_Turn[2 * chart + 1]);
                         box += trial.piece[p].box;
                         need = trial.piece[p].need > need ? trial.piece[p].need : need;
                     }
@@ -617,10 +647,11 @@ namespace
             {
                 uint32_t id = p == 0 ? chart : m_ChartCount++;
                 m_Ranges[id] = {r.begin + start[p], r.begin + start[p + 1]};
-                m_Shapes[id] = plan.piece[p];
                 m_Plans[id].done = false;
                 for (uint32_t i = m_Ranges[id].begin; i < m_Ranges[id].end; ++i)
                     m_ChartOf[m_Members[i]] = id;
+                if (!MeasureChart(id))   // in its own frame now
+                    return false;
             }
             return true;
         }
@@ -634,6 +665,7 @@ namespace
         Scratch<uint8_t> m_Mask, m_Out, m_Side;
         Scratch<Range> m_Ranges;
         Scratch<Shape> m_Shapes;
+        Scratch<double> m_Turn;   // 2 a chart: cosine and sine of its minimum-area frame
         Scratch<Plan> m_Plans;
         MinHeap m_Heap;
         HullScratch m_Hull;
