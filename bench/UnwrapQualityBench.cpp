@@ -9,16 +9,15 @@
 // at about 10k, 100k and 1M triangles (-no-large leaves out the 1M ones). -bin runs the ChartBake
 // (and libraries) of another build, for instance a copy kept from before a change.
 //
-// Memory, from the peak resident memory of the ChartBake run, in two ratios:
-//   mem/x  (peak - the peak of a run on a one-triangle mesh) over the mesh's input arrays,
-//          12 V + 12 T bytes (positions, indices);
-//   io/x   (peak - the peak of a run on an empty mesh: the program and its libraries, which
-//          never call the unwrapper) over the input and the output arrays, 12 V + 36 T bytes
-//          (the output holds 6 floats a triangle). ChartBake holds both while the library runs,
-//          so io/x is at least 1, and io/x - 1 is the unwrapper's own working memory, fixed costs
-//          included, over the arrays it reads and writes.
-// The one-triangle run of mem/x includes the unwrapper's fixed costs (packing's bitmaps), so
-// small meshes can come out below it, even negative.
+// Memory: the peak resident memory of the ChartBake run minus that of a run on a one-triangle
+// mesh (the program, its libraries, and the unwrapper's fixed costs, mostly packing's bitmaps;
+// the header also gives an empty mesh's run, which never calls the unwrapper), in two ratios:
+//   mem/x  over the mesh's input arrays, 12 V + 12 T bytes (positions, indices);
+//   io/x   over the input and the output arrays, 12 V + 36 T bytes (the output holds 6 floats a
+//          triangle). ChartBake holds both while the library runs, so io/x - 1 is the
+//          unwrapper's own working memory over the arrays it reads and writes.
+// On small meshes the runs' noise and the fixed costs outweigh the arrays: ratios there can come
+// out below 1, even negative.
 // bench/quality-meshes.sh fetches the Debian libcgal-demo meshes and runs this.
 #include "Editor/Tools/Unwrap/source/UVStat/TestMeshes.h"
 #include "Editor/Tools/Unwrap/source/UVStat/UVStat.h"
@@ -197,7 +196,7 @@ namespace
         double secondsPer100k = 0, peakMegabytes = 0, memoryRatio = 0, inOutRatio = 0;
     };
 
-    Row Measure(const NamedMesh& m, const std::string& dir, int runs, long baselineKilobytes, long emptyKilobytes)
+    Row Measure(const NamedMesh& m, const std::string& dir, int runs, long baselineKilobytes)
     {
         Row row;
         row.name = m.name;
@@ -229,7 +228,7 @@ namespace
         row.peakMegabytes = peak / 1024.0;
         double meshBytes = 12.0 * m.mesh.VertexCount() + 12.0 * row.triangles;
         row.memoryRatio = (peak - baselineKilobytes) * 1024.0 / meshBytes;
-        row.inOutRatio = (peak - emptyKilobytes) * 1024.0 / (meshBytes + 24.0 * row.triangles);
+        row.inOutRatio = (peak - baselineKilobytes) * 1024.0 / (meshBytes + 24.0 * row.triangles);
         return row;
     }
 
@@ -329,8 +328,8 @@ int main(int argc, char** argv)
 
     char pattern[] = "/tmp/unwrap-quality-XXXXXX";
     std::string dir = mkdtemp(pattern);
-    // ChartBake's own footprint is left out of the memory ratios: with the unwrapper's fixed costs
-    // (a one-triangle mesh) and without (an empty mesh).
+    // ChartBake's own footprint, on a one-triangle mesh, is left out of the memory ratios; an
+    // empty mesh's run shows how much of it is the unwrapper's fixed costs.
     UVStat::WriteBinaryMeshFile(dir + "/mesh.bin", UVStat::TestMesh());
     long empty = RunChartBake(dir).peakKilobytes;
     UVStat::TestMesh tiny;
@@ -338,15 +337,15 @@ int main(int argc, char** argv)
     UVStat::WriteBinaryMeshFile(dir + "/mesh.bin", tiny);
     long baseline = RunChartBake(dir).peakKilobytes;
 
-    std::printf("%s/ChartBake, default parameters (packMargin 1/256), median of %d runs; mem/x = (peak RSS - %.1f MB, a "
-                "one-triangle mesh's) / (12 V + 12 T bytes: input); io/x = (peak RSS - %.1f MB, an empty mesh's) / "
-                "(12 V + 36 T bytes: input and output)\n",
+    std::printf("%s/ChartBake, default parameters (packMargin 1/256), median of %d runs; memory = peak RSS - %.1f MB (a "
+                "one-triangle mesh's; an empty mesh's: %.1f MB); mem/x = memory / (12 V + 12 T bytes: input), io/x = "
+                "memory / (12 V + 36 T bytes: input and output)\n",
                 g_BinDir.c_str(), runs, baseline / 1024.0, empty / 1024.0);
     PrintHeader();
     std::vector<Row> rows;
     for (const NamedMesh& m : meshes)
     {
-        rows.push_back(Measure(m, dir, runs, baseline, empty));
+        rows.push_back(Measure(m, dir, runs, baseline));
         PrintRow(rows.back());
         std::fflush(stdout);
     }

@@ -26,33 +26,37 @@ struct TriangleSlot
     static const uint32_t kCurvature = 4;
 };
 
-// The unit normal of triangle t, (0, 0, 0) for a degenerate one.
-struct TriangleNormals
+// Triangle t's edge cross product (p1 - p0) x (p2 - p0), from the positions: twice the area
+// along the normal.
+struct TriangleCorners
 {
     const float* vertex;
     const uint32_t* tri;
     const uint8_t* degenerate;
-    Vec3 operator[](uint32_t t) const
+    Vec3 TwiceArea(uint32_t t) const
     {
         const uint32_t* v = tri + 3ull * t;
         Vec3 p0 = Position(vertex, v[0]);
-        Vec3 cross = Cross(Position(vertex, v[1]) - p0, Position(vertex, v[2]) - p0);
-        return degenerate[t] ? Vec3{0, 0, 0} : cross * (1 / Length(cross));
+        return Cross(Position(vertex, v[1]) - p0, Position(vertex, v[2]) - p0);
+    }
+};
+
+// The unit normal of triangle t, (0, 0, 0) for a degenerate one.
+struct TriangleNormals : TriangleCorners
+{
+    Vec3 operator[](uint32_t t) const
+    {
+        if (degenerate[t])
+            return {0, 0, 0};
+        Vec3 cross = TwiceArea(t);
+        return cross * (1 / Length(cross));
     }
 };
 
 // The 3D area of triangle t, 0 for a degenerate one.
-struct TriangleAreas
+struct TriangleAreas : TriangleCorners
 {
-    const float* vertex;
-    const uint32_t* tri;
-    const uint8_t* degenerate;
-    double operator[](uint32_t t) const
-    {
-        const uint32_t* v = tri + 3ull * t;
-        Vec3 p0 = Position(vertex, v[0]);
-        return degenerate[t] ? 0 : 0.5 * Length(Cross(Position(vertex, v[1]) - p0, Position(vertex, v[2]) - p0));
-    }
+    double operator[](uint32_t t) const { return degenerate[t] ? 0 : 0.5 * Length(TwiceArea(t)); }
 };
 
 // The 3D length of half-edge h (3t + c, from corner c to corner (c + 1) % 3), rounded to float.
