@@ -3,8 +3,8 @@
 // Input: the caller's mesh (indices checked to be in range, positions finite) and the parameters.
 // Output: a ChartMesh over arrays owned by PreparedMesh:
 //   - with recollectVertices set, vertices at bit-for-bit the same position are one (VertexWelding);
-//   - degenerate triangles (MeasureTriangles) are flagged and linked to
-//     nothing, so they never drive chart growing (they get UVs later from the chart they sit in);
+//   - degenerate triangles (MeasureTriangles) are flagged and linked to nothing, so they never
+//     drive chart growing (they get UVs later from the chart they sit in);
 //   - edge twins (MeshAdjacency): edges shared by more than two triangles or with opposite winding
 //     are seams; so is every edge whose two triangles' normals are more than hardAngle apart,
 //     unless both triangles come from one source polygon (srcPoly), which must stay in one piece;
@@ -13,8 +13,8 @@
 //     all of whose edges are linked (interior vertices of the cut surface). A chart's sum of it
 //     tells how far from developable the chart is, which conformal flattening turns into area
 //     distortion; signed, so that the noise of scanned surfaces cancels out as it does in the map;
-//   - each vertex's corners in non-degenerate triangles, every corner's angle and every edge's length (for
-//     the growing's costs and its tests at vertices).
+//   - each vertex's corners in non-degenerate triangles and every corner's angle (for the
+//     growing's tests at vertices).
 // Memory: normals, areas and edge lengths are computed on use; corner angles and curvature are
 // kept in `slots`, the caller's output UV array (6 floats a triangle; ChartMesh.h tells how long
 // they stay valid). What is owned here: twins (12 bytes a triangle), the degenerate flags (1),
