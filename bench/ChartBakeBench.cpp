@@ -2,7 +2,8 @@
 // formats, and shows where the time goes (ChartBake reports its phases with CHARTBAKE_TIMINGS):
 // per run the phases, then the medians of the read phase as MB/s of input and of the peak
 // resident memory at the end of reading over the bytes of the mesh arrays read (positions,
-// triangles and, from OBJ, one UV pair a corner).
+// triangles and, from OBJ, one UV pair a corner), and of the whole run's peak over the same
+// bytes and over them plus the output UVs (24 bytes a triangle), which ChartBake must hold too.
 //
 //   ChartBakeBench [triangles=1000000] [runs=3] [-keep <dir>]
 //
@@ -115,12 +116,13 @@ namespace
         return at == std::string::npos ? -1 : std::atof(report.c_str() + at + label.size());
     }
 
-    void TimeRuns(const std::string& dir, const std::vector<std::string>& args, int runs, double inputBytes, double meshBytes)
+    void TimeRuns(const std::string& dir, const std::vector<std::string>& args, int runs, double inputBytes, double meshBytes,
+                  double outputBytes)
     {
         const std::string chartBake = std::string(CHARTBAKE_BIN_DIR) + "/ChartBake";
         std::vector<std::string> argv = {chartBake};
         argv.insert(argv.end(), args.begin(), args.end());
-        std::vector<double> readRates, memoryRatios;
+        std::vector<double> readRates, memoryRatios, wholeRatios, withOutputRatios;
         for (int run = 0; run < runs; ++run)
         {
             auto start = std::chrono::steady_clock::now();
@@ -132,11 +134,19 @@ namespace
             double readKB = memoryLine == std::string::npos ? -1 : Field(r.err.substr(memoryLine), ", read ");
             if (readMs > 0)
                 readRates.push_back(inputBytes / 1e6 / (readMs / 1e3));
+            double wholeKB = memoryLine == std::string::npos ? -1 : Field(r.err.substr(memoryLine), ", write ");
             if (readKB > 0)
                 memoryRatios.push_back(readKB * 1024.0 / meshBytes);
+            if (wholeKB > 0)
+            {
+                wholeRatios.push_back(wholeKB * 1024.0 / meshBytes);
+                withOutputRatios.push_back(wholeKB * 1024.0 / (meshBytes + outputBytes));
+            }
         }
         std::printf("  median read: %.0f MB/s; median peak memory after reading / mesh data (%.1f MB): %.2f\n",
                     Median(readRates), meshBytes / 1e6, Median(memoryRatios));
+        std::printf("  median whole-run peak memory / mesh data: %.2f; / (mesh data + output UVs, %.1f MB): %.2f\n",
+                    Median(wholeRatios), (meshBytes + outputBytes) / 1e6, Median(withOutputRatios));
     }
 
     // LoadFromObj against ReadObjWithScanf, bit for bit, under the driver's rounding toward zero.
@@ -198,9 +208,10 @@ int main(int argc, char** argv)
     const double binBytes = (double)std::filesystem::file_size(dir + "/mesh.bin");
     const double positionAndTriangleBytes = 12.0 * grid.VertexCount() + 12.0 * grid.TriangleCount();
     std::printf("OBJ (%.1f MB in):\n", objBytes / 1e6);
-    TimeRuns(dir, {"-obj", "mesh.obj", "out.obj"}, runs, objBytes, positionAndTriangleBytes + 24.0 * grid.TriangleCount());
+    const double uvBytes = 24.0 * grid.TriangleCount();
+    TimeRuns(dir, {"-obj", "mesh.obj", "out.obj"}, runs, objBytes, positionAndTriangleBytes + uvBytes, uvBytes);
     std::printf("binary (%.1f MB in):\n", binBytes / 1e6);
-    TimeRuns(dir, {"mesh.bin", "out.bin"}, runs, binBytes, positionAndTriangleBytes);
+    TimeRuns(dir, {"mesh.bin", "out.bin"}, runs, binBytes, positionAndTriangleBytes, uvBytes);
     if (keepDir.empty())
         std::filesystem::remove_all(dir);
     return 0;

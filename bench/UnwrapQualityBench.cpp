@@ -3,10 +3,21 @@
 // (median of several runs), with its peak memory, and the layout is measured with uvstat's
 // library (the same code as bin/uvstat). One row a mesh, then the medians.
 //
-//   UnwrapQualityBench [-runs <n>] [-no-large] [mesh.off ...]
+//   UnwrapQualityBench [-runs <n>] [-no-large] [-bin <dir>] [mesh.off ...]
 //
 // OFF files (polygons are split into fans) are added to the generated meshes: torus and sphere
-// at about 10k, 100k and 1M triangles (-no-large leaves out the 1M ones).
+// at about 10k, 100k and 1M triangles (-no-large leaves out the 1M ones). -bin runs the ChartBake
+// (and libraries) of another build, for instance a copy kept from before a change.
+//
+// Memory: the peak resident memory of the ChartBake run minus that of a run on a one-triangle
+// mesh (the program, its libraries, and the unwrapper's fixed costs, mostly packing's bitmaps;
+// the header also gives an empty mesh's run, which never calls the unwrapper), in two ratios:
+//   mem/x  over the mesh's input arrays, 12 V + 12 T bytes (positions, indices);
+//   io/x   over the input and the output arrays, 12 V + 36 T bytes (the output holds 6 floats a
+//          triangle). ChartBake holds both while the library runs, so io/x - 1 is the
+//          unwrapper's own working memory over the arrays it reads and writes.
+// On small meshes the runs' noise and the fixed costs outweigh the arrays: ratios there can come
+// out below 1, even negative.
 // bench/quality-meshes.sh fetches the Debian libcgal-demo meshes and runs this.
 #include "Editor/Tools/Unwrap/source/UVStat/TestMeshes.h"
 #include "Editor/Tools/Unwrap/source/UVStat/UVStat.h"
@@ -71,6 +82,8 @@ namespace
         return true;
     }
 
+    std::string g_BinDir = CHARTBAKE_BIN_DIR;
+
     struct RunResult
     {
         bool ok = false;
@@ -88,7 +101,7 @@ namespace
         posix_spawn_file_actions_init(&actions);
         posix_spawn_file_actions_addchdir_np(&actions, dir.c_str());
         posix_spawn_file_actions_addopen(&actions, 1, log.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
-        std::string program = std::string(CHARTBAKE_BIN_DIR) + "/ChartBake";
+        std::string program = g_BinDir + "/ChartBake";
         char* args[] = {program.data(), const_cast<char*>("mesh.bin"), const_cast<char*>("out.bin"), nullptr};
         auto start = std::chrono::steady_clock::now();
         pid_t child = 0;
@@ -180,7 +193,7 @@ namespace
         uint32_t triangles = 0;
         bool unwrapped = false;
         UVStat::Report report;
-        double secondsPer100k = 0, peakMegabytes = 0, memoryRatio = 0;
+        double secondsPer100k = 0, peakMegabytes = 0, memoryRatio = 0, inOutRatio = 0;
     };
 
     Row Measure(const NamedMesh& m, const std::string& dir, int runs, long baselineKilobytes)
@@ -215,13 +228,14 @@ namespace
         row.peakMegabytes = peak / 1024.0;
         double meshBytes = 12.0 * m.mesh.VertexCount() + 12.0 * row.triangles;
         row.memoryRatio = (peak - baselineKilobytes) * 1024.0 / meshBytes;
+        row.inOutRatio = (peak - baselineKilobytes) * 1024.0 / (meshBytes + 24.0 * row.triangles);
         return row;
     }
 
     void PrintHeader()
     {
-        std::printf("%-22s %8s %6s %6s %6s %7s %7s %7s %8s %7s %7s %9s %8s %7s %5s\n", "mesh", "tris", "charts", "util",
-                    "vsplit", "L2", "Linf", "angle", "areaDist", "overlap", "margin", "s/100k", "peakMB", "mem/x", "valid");
+        std::printf("%-22s %8s %6s %6s %6s %7s %7s %7s %8s %7s %7s %9s %8s %7s %6s %5s\n", "mesh", "tris", "charts", "util",
+                    "vsplit", "L2", "Linf", "angle", "areaDist", "overlap", "margin", "s/100k", "peakMB", "mem/x", "io/x", "valid");
     }
 
     void PrintRow(const Row& r)
@@ -233,11 +247,11 @@ namespace
         }
         const UVStat::Validity& v = r.report.validity;
         const UVStat::Quality& q = r.report.quality;
-        std::printf("%-22s %8u %6u %6.3f %6.3f %7.4f %7.3f %7.4f %8.4f %7llu %7llu %9.3f %8.1f %7.2f %5s\n", r.name.c_str(),
+        std::printf("%-22s %8u %6u %6.3f %6.3f %7.4f %7.3f %7.4f %8.4f %7llu %7llu %9.3f %8.1f %7.2f %6.2f %5s\n", r.name.c_str(),
                     r.triangles, q.charts, q.utilization, q.vertexSplit, q.l2Stretch, q.lInfStretch, q.angleDistortion,
                     q.chartAreaDistortion, (unsigned long long)(v.overlapPairsBetweenCharts + v.overlapPairsInsideCharts),
                     (unsigned long long)(v.marginViolations + v.borderViolations), r.secondsPer100k, r.peakMegabytes,
-                    r.memoryRatio, r.report.Valid() ? "yes" : "NO");
+                    r.memoryRatio, r.inOutRatio, r.report.Valid() ? "yes" : "NO");
     }
 
     void PrintMedians(const std::vector<Row>& rows)
@@ -252,7 +266,7 @@ namespace
         size_t valid = 0, failed = 0;
         for (const Row& r : rows)
             valid += r.unwrapped && r.report.Valid(), failed += !r.unwrapped;
-        std::printf("%-22s %8s %6.1f %6.3f %6.3f %7.4f %7.3f %7.4f %8.4f %7.0f %7.0f %9.3f %8.1f %7.2f %zu/%zu\n", "MEDIAN", "",
+        std::printf("%-22s %8s %6.1f %6.3f %6.3f %7.4f %7.3f %7.4f %8.4f %7.0f %7.0f %9.3f %8.1f %7.2f %6.2f %zu/%zu\n", "MEDIAN", "",
                     median([](const Row& r) { return double(r.report.quality.charts); }),
                     median([](const Row& r) { return r.report.quality.utilization; }),
                     median([](const Row& r) { return r.report.quality.vertexSplit; }),
@@ -265,7 +279,8 @@ namespace
                     }),
                     median([](const Row& r) { return double(r.report.validity.marginViolations + r.report.validity.borderViolations); }),
                     median([](const Row& r) { return r.secondsPer100k; }), median([](const Row& r) { return r.peakMegabytes; }),
-                    median([](const Row& r) { return r.memoryRatio; }), valid, rows.size());
+                    median([](const Row& r) { return r.memoryRatio; }), median([](const Row& r) { return r.inOutRatio; }), valid,
+                    rows.size());
         if (failed)
             std::printf("%zu mesh(es) failed to unwrap\n", failed);
     }
@@ -273,7 +288,6 @@ namespace
 
 int main(int argc, char** argv)
 {
-    g_Spawner.Start();
     int runs = 3;
     bool large = true;
     std::vector<std::string> files;
@@ -284,9 +298,12 @@ int main(int argc, char** argv)
             runs = std::max(1, std::atoi(argv[++i]));
         else if (arg == "-no-large")
             large = false;
+        else if (arg == "-bin" && i + 1 < argc)
+            g_BinDir = argv[++i];
         else
             files.push_back(arg);
     }
+    g_Spawner.Start();   // before any mesh is loaded (Spawner)
 
     std::vector<NamedMesh> meshes;
     for (const std::string& path : files)
@@ -311,15 +328,19 @@ int main(int argc, char** argv)
 
     char pattern[] = "/tmp/unwrap-quality-XXXXXX";
     std::string dir = mkdtemp(pattern);
-    // ChartBake's own footprint, on a one-triangle mesh, is left out of the memory ratio.
+    // ChartBake's own footprint, on a one-triangle mesh, is left out of the memory ratios; an
+    // empty mesh's run shows how much of it is the unwrapper's fixed costs.
+    UVStat::WriteBinaryMeshFile(dir + "/mesh.bin", UVStat::TestMesh());
+    long empty = RunChartBake(dir).peakKilobytes;
     UVStat::TestMesh tiny;
     tiny.Face(tiny.Add(0, 0, 0), tiny.Add(1, 0, 0), tiny.Add(0, 1, 0));
     UVStat::WriteBinaryMeshFile(dir + "/mesh.bin", tiny);
     long baseline = RunChartBake(dir).peakKilobytes;
 
-    std::printf("ChartBake, default parameters (packMargin 1/256), median of %d runs; memory ratio = (peak RSS - %.1f MB "
-                "for a one-triangle mesh) / (12 V + 12 T bytes)\n",
-                runs, baseline / 1024.0);
+    std::printf("%s/ChartBake, default parameters (packMargin 1/256), median of %d runs; memory = peak RSS - %.1f MB (a "
+                "one-triangle mesh's; an empty mesh's: %.1f MB); mem/x = memory / (12 V + 12 T bytes: input), io/x = "
+                "memory / (12 V + 36 T bytes: input and output)\n",
+                g_BinDir.c_str(), runs, baseline / 1024.0, empty / 1024.0);
     PrintHeader();
     std::vector<Row> rows;
     for (const NamedMesh& m : meshes)

@@ -102,7 +102,8 @@ void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rule
 {
     ChartProxy& proxy = m_Proxy[c];
     m_ChartOf[f] = c;
-    m_Distance[f] = cost;
+    if (rules.geodesic)   // read only by geodesic growing: other rules leave its pages untouched
+        m_Distance[f] = cost;
     if (!rules.fixedProxies)
     {
         proxy.normalSum = proxy.normalSum + m_Mesh->normal[f] * m_Mesh->area[f];

@@ -1,7 +1,6 @@
 #include "ChartMesh.h"
 
-void MeasureTriangles(const float* vertex, const uint32_t* tri, uint32_t triCount, Vec3* normal, double* area,
-                      uint8_t* degenerate)
+void MeasureTriangles(const float* vertex, const uint32_t* tri, uint32_t triCount, uint8_t* degenerate)
 {
     for (uint32_t t = 0; t < triCount; ++t)
     {
@@ -10,11 +9,8 @@ void MeasureTriangles(const float* vertex, const uint32_t* tri, uint32_t triCoun
         double longest = Dot(e0, e0);
         longest = Dot(e1, e1) > longest ? Dot(e1, e1) : longest;
         longest = Dot(e2, e2) > longest ? Dot(e2, e2) : longest;
-        Vec3 cross = Cross(e0, p2 - p0);
-        double twice = Length(cross);
+        double twice = Length(Cross(e0, p2 - p0));
         degenerate[t] = !(twice > 1e-9 * longest) || longest == 0;
-        area[t] = degenerate[t] ? 0 : 0.5 * twice;
-        normal[t] = degenerate[t] ? Vec3{0, 0, 0} : cross * (1 / twice);
     }
 }
 

@@ -32,8 +32,10 @@ namespace
 bool UnwrapIntoCharts(const float* vertex, uint32_t vertexCount, const uint32_t* tri, const uint32_t* srcPoly,
                       uint32_t triCount, const UnwrapParam& param, float* outUV, UnwrapStats* stats, const char** error)
 {
+    // outUV holds each triangle's corner angles and curvature until flattening writes the
+    // triangle's UVs over them (ChartMesh.h).
     PreparedMesh prepared;
-    if (!PrepareMesh(vertex, vertexCount, tri, srcPoly, triCount, param, &prepared))
+    if (!PrepareMesh(vertex, vertexCount, tri, srcPoly, triCount, param, outUV, &prepared))
         return (*error = kOutOfMemory), false;
     const ChartMesh& mesh = prepared.mesh;
     Scratch<uint32_t> chartOf;
@@ -46,6 +48,7 @@ bool UnwrapIntoCharts(const float* vertex, uint32_t vertexCount, const uint32_t*
     FlattenStats flattening;
     DistortionLimits limits = {param.angleDistortionThreshold, param.areaDistortionThreshold};
     charts = FlattenCharts(mesh, limits, charts, chartOf.Data(), outUV, &flattening);
+    prepared.ReleaseCornerLists();   // packing and the output check work on twins and UVs only
     if (charts == kNoChart)
         return (*error = kOutOfMemory), false;
     CutStats cutting;

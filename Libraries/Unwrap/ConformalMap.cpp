@@ -20,29 +20,28 @@ namespace
 
     // The conformal energy's matrix: per directed triangle edge a -> b with opposite corner k,
     // L gets w = cot(angle at k) / 2 on both diagonals and -w off them, B gets +1/2 at (a, b) and
-    // -1/2 at (b, a) (the area form). The diagonal is summed here, in triangle order, rather than
-    // passed as triplets: a third less scratch at the chart's peak, the same sums.
+    // -1/2 at (b, a) (the area form). Assembled in place (HermitianMatrix::Start), the diagonal
+    // summed in triangle order.
     bool BuildConformalMatrix(const ChartMesh& mesh, const uint32_t* triangles, uint32_t count, const uint32_t* corner,
                               uint32_t vertices, HermitianMatrix* h)
     {
-        Scratch<uint32_t> rows;
-        Scratch<MatrixEntry> triplets;
-        Scratch<double> diagonal;
-        if (!rows.Allocate(6ull * count) || !triplets.Allocate(6ull * count) || !diagonal.Allocate(vertices + 1ull))
+        if (!h->Start(vertices))
             return false;
-        memset(diagonal.Data(), 0, (vertices + 1ull) * sizeof(double));
-        uint64_t k = 0;
+        for (uint32_t i = 0; i < 3 * count; ++i)
+            h->Count(corner[i]), h->Count(corner[i % 3 == 2 ? i - 2 : i + 1]);
+        if (!h->Place())
+            return false;
         for (uint32_t i = 0; i < count; ++i)
             for (uint32_t c = 0; c < 3; ++c)
             {
                 uint32_t a = corner[3 * i + c], b = corner[3 * i + (c + 1) % 3];
                 double w = 0.5 * Cotangent(mesh, triangles[i], (c + 2) % 3);
-                rows[k] = a, triplets[k++] = {b, -w, 0.5};
-                rows[k] = b, triplets[k++] = {a, -w, -0.5};
-                diagonal[a] += w;
-                diagonal[b] += w;
+                h->Put(a, {b, -w, 0.5});
+                h->Put(b, {a, -w, -0.5});
+                h->diag[a] += w;
+                h->diag[b] += w;
             }
-        return h->FromTriplets(vertices, rows.Data(), triplets.Data(), k, diagonal.Data());
+        return h->Finish();
     }
 
     // Incomplete Cholesky factor (no fill) of H seen as the complex Hermitian matrix L + iB acting

@@ -2,26 +2,26 @@
 
 #include "WinImports.h"
 
-bool HermitianMatrix::FromTriplets(uint32_t size, const uint32_t* rows, const MatrixEntry* triplets, uint64_t count,
-                                   const double* diagonal)
+bool HermitianMatrix::Start(uint32_t size)
 {
     n = size;
-    if (!rowStart.Allocate(n + 1ull) || !entries.Allocate(count + 1) || !diag.Allocate(n + 1ull))
+    if (!rowStart.Allocate(n + 2ull) || !diag.Allocate(n + 1ull))
         return false;
-    memset(rowStart.Data(), 0, (n + 1ull) * sizeof(uint32_t));
+    memset(rowStart.Data(), 0, (n + 2ull) * sizeof(uint32_t));
     memset(diag.Data(), 0, (n + 1ull) * sizeof(double));
-    if (diagonal)
-        memcpy(diag.Data(), diagonal, n * sizeof(double));
-    for (uint64_t k = 0; k < count; ++k)
-        if (rows[k] != triplets[k].column)
-            ++rowStart[rows[k] + 1];
-        else
-            diag[rows[k]] += triplets[k].laplace;
+    return true;
+}
+
+bool HermitianMatrix::Place()
+{
     for (uint32_t i = 0; i < n; ++i)
         rowStart[i + 1] += rowStart[i];
-    for (uint64_t k = 0; k < count; ++k)
-        if (rows[k] != triplets[k].column)
-            entries[rowStart[rows[k]]++] = triplets[k];
+    return entries.Allocate(rowStart[n] + 1ull);
+}
+
+bool HermitianMatrix::Finish()
+{
+    // Put left rowStart[i] at the end of row i: shift back to the starts.
     for (uint32_t i = n; i > 0; --i)
         rowStart[i] = rowStart[i - 1];
     rowStart[0] = 0;
@@ -51,7 +51,8 @@ bool HermitianMatrix::FromTriplets(uint32_t size, const uint32_t* rows, const Ma
         }
     }
     rowStart[n] = out;
-    return true;
+    // Interior edges came twice: about half the room goes back before the solver's arrays come.
+    return entries.Grow(out, out + 1ull);
 }
 
 void HermitianMatrix::Multiply(const double* x, double* y) const

@@ -21,11 +21,18 @@ struct HermitianMatrix
     Scratch<MatrixEntry> entries;
     Scratch<double> diag;
 
-    // The matrix of `count` entries (rows[k], entries[k]) summed; diag starts as `diagonal` (n
-    // values; zeros when null) and entries on the diagonal add their real part to it. False when
-    // scratch memory runs out.
-    bool FromTriplets(uint32_t size, const uint32_t* rows, const MatrixEntry* triplets, uint64_t count,
-                      const double* diagonal = nullptr);
+    // Assembly without a list of triplets (a third of the memory at a chart's peak), in passes
+    // over the same off-diagonal entries:
+    //   Start(size): no entries, a zero diagonal (callers add to diag directly);
+    //   Count(row) for every entry, then Place() to make room;
+    //   Put(row, entry) for the same entries, then Finish(): every row sorted by column, entries
+    //   of one column summed in the order they were put, and the room of the duplicates given
+    //   back. False when scratch memory runs out.
+    bool Start(uint32_t size);
+    void Count(uint32_t row) { ++rowStart[row + 1]; }
+    bool Place();
+    void Put(uint32_t row, const MatrixEntry& entry) { entries[rowStart[row]++] = entry; }
+    bool Finish();
 
     // y = A x (x, y interleaved pairs; they must not alias).
     void Multiply(const double* x, double* y) const;

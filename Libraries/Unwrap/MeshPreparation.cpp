@@ -24,7 +24,7 @@ namespace
     }
 
     // Angle defects (signed) at interior vertices, spread over the triangles by corner angle.
-    bool MeasureCurvature(const ChartMesh& mesh, double* curvature)
+    bool MeasureCurvature(const ChartMesh& mesh, float* slots)
     {
         Scratch<double> angleSum;
         Scratch<uint8_t> open;
@@ -43,13 +43,14 @@ namespace
         }
         for (uint32_t t = 0; t < mesh.triCount; ++t)
         {
-            curvature[t] = 0;
+            double curvature = 0;
             for (uint32_t c = 0; c < 3 && !mesh.degenerate[t]; ++c)
             {
                 uint32_t v = mesh.tri[3 * t + c];
                 if (!open[v] && angleSum[v] > 0)
-                    curvature[t] += (2 * kPi - angleSum[v]) * mesh.cornerAngle[3 * t + c] / angleSum[v];
+                    curvature += (2 * kPi - angleSum[v]) * mesh.cornerAngle[3 * t + c] / angleSum[v];
             }
+            memcpy(slots + TriangleSlot::kFloats * (uint64_t)t + TriangleSlot::kCurvature, &curvature, sizeof curvature);
         }
         return true;
     }
@@ -76,7 +77,7 @@ namespace
 }
 
 bool PrepareMesh(const float* vertex, uint32_t vertexCount, const uint32_t* tri, const uint32_t* srcPoly, uint32_t triCount,
-                 const UnwrapParam& param, PreparedMesh* out)
+                 const UnwrapParam& param, float* slots, PreparedMesh* out)
 {
     if (param.recollectVertices)
     {
@@ -84,24 +85,41 @@ bool PrepareMesh(const float* vertex, uint32_t vertexCount, const uint32_t* tri,
             return false;
         tri = out->welded.Data();
     }
-    if (!out->twin.Allocate(3ull * triCount) || !out->normal.Allocate(triCount) || !out->area.Allocate(triCount) ||
-        !out->curvature.Allocate(triCount) || !out->degenerate.Allocate(triCount) ||
-        !out->aroundStart.Allocate(vertexCount + 1ull) || !out->around.Allocate(3ull * triCount + 1) ||
-        !out->cornerAngle.Allocate(3ull * triCount) || !out->edgeLength.Allocate(3ull * triCount))
+    // The twins first: their sort's scratch (twice the twins' size) is gone before the corner
+    // lists are made, which keeps this stage's peak low.
+    if (!out->twin.Allocate(3ull * triCount) || !out->degenerate.Allocate(triCount) ||
+        !FindTwins(tri, triCount, vertexCount, out->twin.Data()))
         return false;
-    MeasureTriangles(vertex, tri, triCount, out->normal.Data(), out->area.Data(), out->degenerate.Data());
-    if (!FindTwins(tri, triCount, vertexCount, out->twin.Data()))
+    if (!out->aroundStart.Allocate(vertexCount + 1ull) || !out->around.Allocate(3ull * triCount + 1))
         return false;
-    out->mesh = {vertex,          vertexCount,          tri,       triCount, out->normal.Data(), out->area.Data(),
-                 out->curvature.Data(), out->degenerate.Data(), out->twin.Data(), srcPoly, out->aroundStart.Data(),
-                 out->around.Data(), out->cornerAngle.Data(), out->edgeLength.Data()};
-    for (uint32_t h = 0; h < 3 * triCount; ++h)
-    {
-        out->cornerAngle[h] = out->degenerate[h / 3] ? 0.0f : (float)CornerAngle3(out->mesh, h / 3, h % 3);
-        out->edgeLength[h] = (float)Length(Position(vertex, tri[NextCorner(h)]) - Position(vertex, tri[h]));
-    }
+    MeasureTriangles(vertex, tri, triCount, out->degenerate.Data());
+    const uint8_t* degenerate = out->degenerate.Data();
+    out->mesh = {vertex,
+                 vertexCount,
+                 tri,
+                 triCount,
+                 {{vertex, tri, degenerate}},
+                 {{vertex, tri, degenerate}},
+                 {slots},
+                 degenerate,
+                 out->twin.Data(),
+                 srcPoly,
+                 out->aroundStart.Data(),
+                 out->around.Data(),
+                 {slots},
+                 {vertex, tri}};
+    for (uint32_t t = 0; t < triCount; ++t)
+        for (uint32_t c = 0; c < 3; ++c)
+            slots[TriangleSlot::kFloats * (uint64_t)t + c] = degenerate[t] ? 0.0f : (float)CornerAngle3(out->mesh, t, c);
     ListTrianglesAroundVertices(out->mesh, out->aroundStart.Data(), out->around.Data());
     double hardAngle = param.hardAngle * (kPi / 180);
     CutSeams(out->mesh, cos(hardAngle), out->twin.Data());
-    return MeasureCurvature(out->mesh, out->curvature.Data());
+    return MeasureCurvature(out->mesh, slots);
+}
+
+void PreparedMesh::ReleaseCornerLists()
+{
+    aroundStart.Release();
+    around.Release();
+    mesh.aroundStart = mesh.around = nullptr;
 }

@@ -3,8 +3,8 @@
 // Input: the caller's mesh (indices checked to be in range, positions finite) and the parameters.
 // Output: a ChartMesh over arrays owned by PreparedMesh:
 //   - with recollectVertices set, vertices at bit-for-bit the same position are one (VertexWelding);
-//   - unit normals and areas; degenerate triangles (MeasureTriangles) are flagged and linked to
-//     nothing, so they never drive chart growing (they get UVs later from the chart they sit in);
+//   - degenerate triangles (MeasureTriangles) are flagged and linked to nothing, so they never
+//     drive chart growing (they get UVs later from the chart they sit in);
 //   - edge twins (MeshAdjacency): edges shared by more than two triangles or with opposite winding
 //     are seams; so is every edge whose two triangles' normals are more than hardAngle apart,
 //     unless both triangles come from one source polygon (srcPoly), which must stay in one piece;
@@ -13,9 +13,14 @@
 //     all of whose edges are linked (interior vertices of the cut surface). A chart's sum of it
 //     tells how far from developable the chart is, which conformal flattening turns into area
 //     distortion; signed, so that the noise of scanned surfaces cancels out as it does in the map;
-//   - each vertex's corners in non-degenerate triangles, every corner's angle and every edge's length (for
-//     the growing's costs and its tests at vertices).
-// Cost: linear in vertices + triangles; about 90 bytes a triangle.
+//   - each vertex's corners in non-degenerate triangles and every corner's angle (for the
+//     growing's tests at vertices).
+// Memory: normals, areas and edge lengths are computed on use; corner angles and curvature are
+// kept in `slots`, the caller's output UV array (6 floats a triangle; ChartMesh.h tells how long
+// they stay valid). What is owned here: twins (12 bytes a triangle), the degenerate flags (1),
+// the corner lists (12, plus 4 a vertex), and with recollectVertices the welded indices (12).
+// Cost: linear in vertices + triangles; the stage's peak adds the twins' sort, 24 bytes a
+// triangle, for a moment.
 #pragma once
 
 #include "ChartMesh.h"
@@ -25,13 +30,14 @@
 struct PreparedMesh
 {
     Scratch<uint32_t> welded, twin, aroundStart, around;
-    Scratch<float> cornerAngle, edgeLength;
-    Scratch<Vec3> normal;
-    Scratch<double> area, curvature;
     Scratch<uint8_t> degenerate;
     ChartMesh mesh;
+
+    // Gives back the corner lists (mesh.around, mesh.aroundStart) once no stage reads them: the
+    // growing (segmentation and splits) and the placing of degenerate triangles (flattening).
+    void ReleaseCornerLists();
 };
 
-// False when scratch memory runs out.
+// False when scratch memory runs out. `slots` is the output UV array (6 floats a triangle).
 bool PrepareMesh(const float* vertex, uint32_t vertexCount, const uint32_t* tri, const uint32_t* srcPoly, uint32_t triCount,
-                 const UnwrapParam& param, PreparedMesh* out);
+                 const UnwrapParam& param, float* slots, PreparedMesh* out);

@@ -7,17 +7,41 @@ namespace
 {
     // --- Allocation ---------------------------------------------------------------------------
 
-    QUILLET_WINAPI void* malloc_impl(unsigned long s) { return malloc(s); }
-    QUILLET_WINAPI void* _malloc_crt_impl(unsigned long s) { return malloc(s); }
-    QUILLET_WINAPI void* _malloc_dbg_impl(unsigned long size, int, const char*, int) { return malloc(size); }
-    QUILLET_WINAPI void* realloc_impl(void* p, unsigned long s) { return realloc(p, s); }
+    // Every block handed to a DLL comes from here. Blocks of kMappedBlockBytes and more get their
+    // own mapping, which their release gives back to the system at once. The C library does that
+    // by default too, but raises the limit to the size of each mapped block freed (up to 32 MB):
+    // after the first large block of a run goes, the next ones come from the heap and, once
+    // freed, stay in the process. The unwrapper frees its stages' arrays as it goes and counts on
+    // that memory leaving, so the limit is fixed here, once, before the first block.
+    const int kMappedBlockBytes = 128 * 1024;
+
+    void FixMappingLimit()
+    {
+        static const bool s_Fixed = mallopt(M_MMAP_THRESHOLD, kMappedBlockBytes) == 1;
+        (void)s_Fixed;
+    }
+
+    void* HostAllocate(size_t size)
+    {
+        FixMappingLimit();
+        return malloc(size);
+    }
+
+    QUILLET_WINAPI void* malloc_impl(unsigned long s) { return HostAllocate(s); }
+    QUILLET_WINAPI void* _malloc_crt_impl(unsigned long s) { return HostAllocate(s); }
+    QUILLET_WINAPI void* _malloc_dbg_impl(unsigned long size, int, const char*, int) { return HostAllocate(size); }
+    QUILLET_WINAPI void* realloc_impl(void* p, unsigned long s)
+    {
+        FixMappingLimit();
+        return realloc(p, s);
+    }
     QUILLET_WINAPI void free_impl(void* p) { free(p); }
 
     // The 32-bit manglings take a 32-bit size; the upper half of the register is not looked at.
-    QUILLET_WINAPI void* operator_new_impl(unsigned int size) { return malloc(size); }
-    QUILLET_WINAPI void* operator_new_array_impl(unsigned int size) { return malloc(size); }
-    QUILLET_WINAPI void* operator_new64_impl(unsigned long size) { return malloc(size); }
-    QUILLET_WINAPI void* operator_new64_array_impl(unsigned long size) { return malloc(size); }
+    QUILLET_WINAPI void* operator_new_impl(unsigned int size) { return HostAllocate(size); }
+    QUILLET_WINAPI void* operator_new_array_impl(unsigned int size) { return HostAllocate(size); }
+    QUILLET_WINAPI void* operator_new64_impl(unsigned long size) { return HostAllocate(size); }
+    QUILLET_WINAPI void* operator_new64_array_impl(unsigned long size) { return HostAllocate(size); }
 
     QUILLET_WINAPI void operator_delete_impl(void* ptr)
     {
@@ -42,7 +66,7 @@ namespace
 
     QUILLET_WINAPI void* HeapAlloc_impl(HANDLE, DWORD dwFlags, unsigned long dwBytes)
     {
-        void* block = malloc(dwBytes);
+        void* block = HostAllocate(dwBytes);
         // A failed allocation is handed back as null, never cleared.
         if (block && (dwFlags & kHeapZeroMemory))
             memset(block, 0, dwBytes);

@@ -2,6 +2,7 @@
 
 #include <ctype.h>
 #include <locale.h>
+#include <malloc.h>
 #include <math.h>
 #include <pthread.h>
 #include <stdio.h>
