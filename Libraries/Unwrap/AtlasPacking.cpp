@@ -43,7 +43,17 @@ namespace
     const uint32_t kExtraCharts = 2000;     // more charts than this: no optional trials
     const uint64_t kExtraWork = 1u << 22;   // the optional trials spend at most twice this (see Packer::work)
     const double kScaleTolerance = 1.01;   // the search stops when success and failure are this close
+    // The fine atlas's first step above the coarse atlas's scale: about what its fatter
+    // drawing of a chart some kCoarseChartTexels across costs.
+    const double kClimbStep = 1.04;
     const int kOrientations = 8;
+    // The coarse atlas draws a typical chart about this many texels across, and is at least
+    // kCoarseMinTexels wide.
+    const double kCoarseChartTexels = 32;
+    const double kCoarseMinTexels = 64;
+    // Below this many triangles the full search on the fine atlas is left out when there is a
+    // coarse one: its cost would dwarf the rest of the unwrap.
+    const uint32_t kSmallMesh = 1000;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
     const double kSlack = 1e-6;
     // cos and sin of k * 45 degrees.
@@ -90,6 +100,13 @@ namespace
         ByExtent
     };
 
+    // The choices a trial is packed with besides the scale and the orientations.
+    struct Variant
+    {
+        Order order;
+        bool minimizeWaste;   // the skyline's choice (see AtlasOccupancy::minimizeWaste)
+    };
+
     // Charts by decreasing key, ties by number: stable LSD radix sort on the float bits.
     bool OrderLargestFirst(const ChartInfo* info, uint32_t n, Order by, uint32_t* order)
     {
@@ -131,8 +148,16 @@ namespace
         // only the share placed, not the height used).
         void SetStopAboveAtlas(bool on) { m_StopAboveAtlas = on; }
 
-        // The skyline's choice (see AtlasOccupancy::minimizeWaste); Reset keeps it.
-        void SetMinimizeWaste(bool on) { m_Atlas.minimizeWaste = on; }
+        Variant variant = {Order::ByArea, false};   // the charts' order and the skyline's choice
+
+        // Orders the charts (into `order`, which the packer reads) and sets the skyline's choice
+        // (see AtlasOccupancy::minimizeWaste; Reset keeps it). False when memory runs out.
+        bool SetVariant(Variant to, const ChartInfo* info, uint32_t* order)
+        {
+            variant = to;
+            m_Atlas.minimizeWaste = to.minimizeWaste;
+            return OrderLargestFirst(info, m_ChartCount, to.order, order);
+        }
 
         Packer(const float* uv, const uint32_t* start, const uint32_t* members, const ChartInfo* info, const uint32_t* order,
                uint8_t* turn, uint32_t chartCount, const Layout& layout)
@@ -324,13 +349,15 @@ namespace
         return true;
     }
 
-    // The atlas bitmap: about 1024 texels a side, more for many charts (whose dilated outlines
-    // then waste less of the margin), with the texel chosen so that a whole number of texels
-    // covers half the margin; what is left of the square's side goes into the inset.
-    Layout ChooseLayout(double margin, uint32_t chartCount)
+    // The atlas bitmap's side: about 1024 texels, more for many charts (whose dilated outlines
+    // then waste less of the margin).
+    uint32_t FineTexels(uint32_t chartCount) { return chartCount <= 1000 ? 1024 : (chartCount <= 8000 ? 2048 : 4096); }
+
+    // The atlas bitmap for about `target` texels a side, with the texel chosen so that a whole
+    // number of texels covers half the margin; what is left of the square's side goes into the inset.
+    Layout ChooseLayout(double margin, uint32_t target)
     {
         double half = margin / 2 + kSlack;
-        uint32_t target = chartCount <= 1000 ? 1024 : (chartCount <= 8000 ? 2048 : 4096);
         double plain = (1 - 2 * half) / target;
         Layout layout;
         layout.dilationTexels = half <= plain ? 1 : (uint32_t)(half / plain + 0.5);
@@ -340,6 +367,21 @@ namespace
             --layout.atlasTexels;
         layout.inset = (1 - layout.atlasTexels * layout.texel) / 2;
         return layout;
+    }
+
+    // The coarse atlas's side: about kCoarseChartTexels texels across the charts that hold most
+    // of the area (the area-weighted mean side) at `scale`; 0 when that is not well below the
+    // fine atlas (many or small charts: they go straight to the fine atlas).
+    uint32_t CoarseTexels(const ChartInfo* info, uint32_t n, double scale, uint32_t fineTexels)
+    {
+        double area = 0, weighted = 0;
+        for (uint32_t c = 0; c < n; ++c)
+            area += info[c].area, weighted += info[c].area * Sqrt(info[c].area);
+        if (!(area > 0 && scale > 0))
+            return 0;
+        double texels = kCoarseChartTexels * area / (scale * weighted);
+        texels = texels > kCoarseMinTexels ? texels : kCoarseMinTexels;
+        return texels * 2 <= fineTexels ? (uint32_t)texels : 0;
     }
 
     // The first scale to try: the charts' dilated squares fill 65 % of the atlas.
@@ -391,18 +433,21 @@ namespace
         double largest;   // the largest chart extent
         Layout layout;
 
+        Variant bestVariant = {Order::ByArea, false};   // how the best layout was packed
+
         bool Fits(const Trial& trial) const { return trial.placedAll && trial.usedRows <= layout.atlasTexels; }
 
-        void Keep(double scale, double* bestScale) const
+        void Keep(const Packer& packer, double scale, double* bestScale)
         {
             *bestScale = scale;
+            bestVariant = packer.variant;
             memcpy(best, trialPlaces, (uint64_t)chartCount * sizeof(ChartPlace));
         }
 
         // From `scale`, at most `trials` packs, each used height predicting the next scale;
         // stops when success and failure are within kScaleTolerance or the packer's work reaches
         // workLimit. False when memory runs out.
-        bool Run(Packer& packer, double scale, int trials, uint64_t workLimit, double* bestScale) const
+        bool Run(Packer& packer, double scale, int trials, uint64_t workLimit, double* bestScale)
         {
             double low = 0, high = 0, turnsScale = 0;
             for (int trialNumber = 0; trialNumber < trials && packer.work < workLimit; ++trialNumber)
@@ -416,7 +461,7 @@ namespace
                 {
                     low = scale;
                     if (scale > *bestScale)
-                        Keep(scale, bestScale);
+                        Keep(packer, scale, bestScale);
                 }
                 else
                 {
@@ -431,12 +476,37 @@ namespace
             return true;
         }
 
+        // From `from`, a scale at which the charts fit on a coarser atlas (which draws them
+        // fatter): steps of kClimbStep up while they fit, then halves the bracket until success
+        // and failure are within kScaleTolerance; at most `trials` packs, every chart in the
+        // orientation the packer holds. False when memory runs out.
+        bool Climb(Packer& packer, double from, int trials, double* bestScale)
+        {
+            double low = from, high = 0;
+            for (int trialNumber = 0; trialNumber < trials && !(high > 0 && high < low * kScaleTolerance); ++trialNumber)
+            {
+                double scale = high > 0 ? Sqrt(low * high) : low * kClimbStep;
+                Trial trial;
+                if (!packer.Pack(scale, false, trialPlaces, &trial))
+                    return false;
+                if (Fits(trial))
+                {
+                    low = scale;
+                    if (scale > *bestScale)
+                        Keep(packer, scale, bestScale);
+                }
+                else
+                    high = scale;
+            }
+            return true;
+        }
+
         // Tries kRefineSteps scales in even steps above `from`, up to kRefineReach times it,
         // every orientation searched, while the work stays below workLimit; keeps the largest
         // that fits. Each scale is tried with the variants in turn (charts' order and the
         // skyline's choice) until one fits: more different layouts for the same work.
         bool Refine(Packer& packer, const ChartInfo* info, uint32_t* order, double from, uint64_t workLimit,
-                    double* bestScale) const
+                    double* bestScale)
         {
             const double kRefineReach = 1.12;
             const int kRefineSteps = 24;
@@ -449,15 +519,14 @@ namespace
                     continue;
                 for (int variant = 0; variant < 4 && packer.work < workLimit; ++variant)
                 {
-                    if (!OrderLargestFirst(info, chartCount, variant & 1 ? Order::ByExtent : Order::ByArea, order))
+                    if (!packer.SetVariant({variant & 1 ? Order::ByExtent : Order::ByArea, variant >= 2}, info, order))
                         return false;
-                    packer.SetMinimizeWaste(variant >= 2);
                     Trial trial;
                     if (!packer.Pack(scale, true, trialPlaces, &trial))
                         return false;
                     if (Fits(trial))
                     {
-                        Keep(scale, bestScale);
+                        Keep(packer, scale, bestScale);
                         break;
                     }
                 }
@@ -465,6 +534,68 @@ namespace
             return true;
         }
     };
+
+    // The charts and the working arrays that the searches of every atlas share.
+    struct Charts
+    {
+        const float* uv;
+        const uint32_t* start;
+        const uint32_t* members;
+        const ChartInfo* info;
+        uint32_t* order;   // the packing order, rewritten by each variant
+        uint8_t* turn;     // each chart's orientation when the turns are not searched
+        uint32_t count;
+        double largest;    // the largest chart extent
+    };
+
+    // A search's result: the largest scale that fitted (0: none) and the variant it was packed with.
+    struct Outcome
+    {
+        double scale;
+        Variant variant;
+    };
+
+    // The search on one atlas; the places of the largest scale that fits go into `best`.
+    // Without a guide: steps 3 and 4 (every orientation, then the other choices within as much
+    // work again). With one (a coarser atlas's outcome and places): every chart keeps the
+    // guide's orientation and order, and only the scale is searched, from the guide's.
+    // False when memory runs out.
+    bool SearchAtlas(const Charts& charts, const Layout& layout, ChartPlace* trialPlaces, ChartPlace* best,
+                     const Outcome* guide, const ChartPlace* guidePlaces, Outcome* outcome)
+    {
+        Packer packer(charts.uv, charts.start, charts.members, charts.info, charts.order, charts.turn, charts.count, layout);
+        ScaleSearch search = {trialPlaces, best, charts.count, charts.largest, layout};
+        double low = 0;
+        if (guide)
+        {
+            for (uint32_t c = 0; c < charts.count; ++c)
+                charts.turn[c] = (uint8_t)guidePlaces[c].orientation;
+            packer.SetStopAboveAtlas(true);
+            if (!packer.SetVariant(guide->variant, charts.info, charts.order) ||
+                !search.Climb(packer, guide->scale, kMaxTrials, &low))
+                return false;
+            *outcome = {low, search.bestVariant};
+            return true;
+        }
+        double first = FirstScale(charts.info, charts.count, layout);
+        if (!packer.SetVariant({Order::ByArea, false}, charts.info, charts.order) ||
+            !search.Run(packer, first, kMaxTrials, ~0ull, &low))
+            return false;
+        // Then, within as much work again (at most 2 kExtraWork), the other order and scales above
+        // the best found: packing is not monotonic in the scale, least so with few charts.
+        // Many charts pack evenly at any scale: they skip it.
+        // No floor: a mesh that packed in a few milliseconds never waits for the second search.
+        uint64_t extraWork =
+            charts.count > kExtraCharts ? 0 : (packer.work < 2 * kExtraWork ? packer.work : 2 * kExtraWork);
+        uint64_t limit = packer.work + extraWork;
+        packer.SetStopAboveAtlas(true);
+        if (!packer.SetVariant({Order::ByExtent, false}, charts.info, charts.order) ||
+            !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
+            !search.Refine(packer, charts.info, charts.order, low, limit, &low))
+            return false;
+        *outcome = {low, search.bestVariant};
+        return true;
+    }
 
     void MoveCorners(float* uv, const uint32_t* chartOf, uint32_t triCount, const ChartInfo* info, const ChartPlace* places,
                      double scale, const Layout& layout)
@@ -508,39 +639,63 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     if (chartCount == 0)
         return true;
 
-    Layout layout = ChooseLayout(margin, chartCount);
+    Layout fine = ChooseLayout(margin, FineTexels(chartCount));
 
     Scratch<uint32_t> start, members, order;
     Scratch<ChartInfo> info;
-    Scratch<ChartPlace> trialPlaces, bestPlaces;
+    Scratch<ChartPlace> trialPlaces, bestPlaces, finePlaces;
+    Scratch<uint8_t> turn;
     if (!GroupCharts(chartOf, triCount, chartCount, start, members) || !info.Allocate(chartCount) ||
         !order.Allocate(chartCount) || !trialPlaces.Allocate(chartCount) || !bestPlaces.Allocate(chartCount) ||
-        !MeasureCharts(uv, start.Data(), members.Data(), chartCount, info.Data()) ||
-        !OrderLargestFirst(info.Data(), chartCount, Order::ByArea, order.Data()))
+        !turn.Allocate(chartCount) || !MeasureCharts(uv, start.Data(), members.Data(), chartCount, info.Data()))
         return (*error = kOutOfMemory), false;
 
     double largest = 0;
     for (uint32_t c = 0; c < chartCount; ++c)
         largest = info[c].extent > largest ? info[c].extent : largest;
-    Scratch<uint8_t> turn;
-    if (!turn.Allocate(chartCount))
-        return (*error = kOutOfMemory), false;
-    Packer packer(uv, start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, layout);
-    ScaleSearch search = {trialPlaces.Data(), bestPlaces.Data(), chartCount, largest, layout};
-    double first = FirstScale(info.Data(), chartCount, layout), low = 0;
-    if (!search.Run(packer, first, kMaxTrials, ~0ull, &low))
-        return (*error = kOutOfMemory), false;
-    // Then, within as much work again (at most 2 kExtraWork), the other order and scales above
-    // the best found: packing is not monotonic in the scale, least so with few charts.
-    // Many charts pack evenly at any scale: they skip it.
-    // No floor: a mesh that packed in a few milliseconds never waits for the second search.
-    uint64_t extraWork = chartCount > kExtraCharts ? 0 : (packer.work < 2 * kExtraWork ? packer.work : 2 * kExtraWork);
-    uint64_t limit = packer.work + extraWork;
-    packer.SetStopAboveAtlas(true);
-    if (!OrderLargestFirst(info.Data(), chartCount, Order::ByExtent, order.Data()) ||
-        !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
-        !search.Refine(packer, info.Data(), order.Data(), low, limit, &low))
-        return (*error = kOutOfMemory), false;
+    Charts charts = {uv, start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, largest};
+    // Few large charts: the whole search also runs on a coarse atlas (a typical chart some 32
+    // texels across, so that a trial costs a small fraction of a fine one), and the fine atlas
+    // then climbs from its scale with the coarse winner's orientations and order. The coarse
+    // layout is valid in itself (its texels are wider than half the margin). The two searches
+    // often find different layouts (packing is far from monotonic), so the larger scale of both
+    // wins; on a small mesh (below kSmallMesh triangles) the full fine search, whose trials cost
+    // about the atlas's area whatever the input, is left out.
+    uint32_t coarseTexels = CoarseTexels(info.Data(), chartCount, FirstScale(info.Data(), chartCount, fine), fine.atlasTexels);
+    Outcome outcome = {0, {Order::ByArea, false}};
+    Layout layout = fine;
+    if (coarseTexels)
+    {
+        Layout coarse = ChooseLayout(margin, coarseTexels);
+        Outcome coarseOutcome, climbed;
+        if (!SearchAtlas(charts, coarse, trialPlaces.Data(), bestPlaces.Data(), nullptr, nullptr, &coarseOutcome) ||
+            !finePlaces.Allocate(chartCount))
+            return (*error = kOutOfMemory), false;
+        outcome = coarseOutcome, layout = coarse;
+        if (coarseOutcome.scale > 0)
+        {
+            if (!SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), &coarseOutcome, bestPlaces.Data(), &climbed))
+                return (*error = kOutOfMemory), false;
+            if (climbed.scale > outcome.scale)
+            {
+                outcome = climbed, layout = fine;
+                memcpy(bestPlaces.Data(), finePlaces.Data(), (uint64_t)chartCount * sizeof(ChartPlace));
+            }
+        }
+    }
+    if (!coarseTexels || triCount >= kSmallMesh || outcome.scale == 0)
+    {
+        Outcome full;
+        if (!finePlaces.Allocate(chartCount) ||
+            !SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), nullptr, nullptr, &full))
+            return (*error = kOutOfMemory), false;
+        if (full.scale > outcome.scale)
+        {
+            outcome = full, layout = fine;
+            memcpy(bestPlaces.Data(), finePlaces.Data(), (uint64_t)chartCount * sizeof(ChartPlace));
+        }
+    }
+    double low = outcome.scale;
     if (low == 0)
         return (*error = kDoesNotFit), false;
     MoveCorners(uv, chartOf, triCount, info.Data(), bestPlaces.Data(), low, layout);
