@@ -107,11 +107,12 @@ namespace
         bool minimizeWaste;   // the skyline's choice (see AtlasOccupancy::minimizeWaste)
     };
 
-    // Charts by decreasing key, ties by number: stable LSD radix sort on the float bits.
+    // Charts by decreasing key, ties by number: stable LSD radix sort on the float bits, a byte a
+    // pass (the count array stays small, so a few charts sort in a few hundred steps).
     bool OrderLargestFirst(const ChartInfo* info, uint32_t n, Order by, uint32_t* order)
     {
-        Scratch<uint32_t> keys, other, count;
-        if (!keys.Allocate(n) || !other.Allocate(n) || !count.Allocate(65537))
+        Scratch<uint32_t> keys, other;
+        if (!keys.Allocate(n) || !other.Allocate(n))
             return false;
         for (uint32_t c = 0; c < n; ++c)
         {
@@ -123,20 +124,21 @@ namespace
         }
         uint32_t* from = order;
         uint32_t* to = other.Data();
-        for (int shift = 0; shift < 32; shift += 16)
+        uint32_t count[257];
+        for (int shift = 0; shift < 32; shift += 8)
         {
-            memset(count.Data(), 0, 65537 * sizeof(uint32_t));
+            memset(count, 0, sizeof(count));
             for (uint32_t i = 0; i < n; ++i)
-                ++count[((keys[from[i]] >> shift) & 0xFFFF) + 1];
-            for (uint32_t d = 0; d < 65536; ++d)
+                ++count[((keys[from[i]] >> shift) & 0xFF) + 1];
+            for (uint32_t d = 0; d < 256; ++d)
                 count[d + 1] += count[d];
             for (uint32_t i = 0; i < n; ++i)
-                to[count[(keys[from[i]] >> shift) & 0xFFFF]++] = from[i];
+                to[count[(keys[from[i]] >> shift) & 0xFF]++] = from[i];
             uint32_t* swap = from;
             from = to;
             to = swap;
         }
-        return true;   // two passes: the result is back in `order`
+        return true;   // an even number of passes: the result is back in `order`
     }
 
     class Packer

@@ -44,14 +44,33 @@ namespace
         return run >= need && visit(start, start + run);
     }
 
+    // Word by word: a clear word extends the run, a full word ends it, only mixed words are
+    // taken apart bit by bit (most words of a packed atlas are clear or full).
     uint32_t LongestClearRun(const uint64_t* row, uint32_t words)
     {
-        uint32_t best = 0;
-        ForEachClearRun(row, words, 1, [&best](uint32_t first, uint32_t end) {
-            best = end - first > best ? end - first : best;
-            return false;
-        });
-        return best;
+        uint32_t best = 0, run = 0;
+        for (uint32_t w = 0; w < words; ++w)
+        {
+            uint64_t bits = row[w];
+            if (bits == 0)
+            {
+                run += 64;
+                continue;
+            }
+            uint32_t low = (uint32_t)__builtin_ctzll(bits);   // clear bits below the first taken one
+            run += low;
+            best = run > best ? run : best;
+            if (~bits != 0)
+            {
+                // Clear runs strictly inside the word: clear bits between taken ones.
+                uint64_t clear = ~bits & ~((bits & (0 - bits)) - 1);   // clear bits above the lowest taken
+                clear &= ~0ull >> __builtin_clzll(bits);               // ... and below the highest taken
+                for (uint32_t inner = 0; clear; clear &= clear << 1)
+                    best = ++inner > best ? inner : best;
+            }
+            run = (uint32_t)__builtin_clzll(bits);   // clear bits above the last taken one
+        }
+        return run > best ? run : best;
     }
 
     bool Fits(const AtlasOccupancy& atlas, const ChartRaster& chart, uint32_t x, uint32_t y)
@@ -198,26 +217,28 @@ namespace
 
 bool AtlasOccupancy::Reset(uint32_t atlasWidth, uint32_t atlasRows)
 {
+    // Rows from `top` on were never written since the last reset: only the rows below are cleared.
+    uint32_t dirtyRows = top;
     if (atlasWidth != width || atlasRows != rows)
     {
         width = atlasWidth, rows = atlasRows, words = (atlasWidth + 63) / 64 + 1;
         skyGroupWidth = (width + 255) / 256;
         if (!bits.Allocate((uint64_t)words * rows) || !longestFree.Allocate(rows) || !sky.Allocate(width) ||
             !skyGroup.Allocate(width / skyGroupWidth + 1))
-            return (width = rows = 0), false;
+            return (width = rows = top = 0), false;
+        dirtyRows = rows;
     }
     // Texels right of the atlas (the last word's tail and the padding word) count as taken.
-    memset(bits.Data(), 0, (uint64_t)words * rows * 8);
+    memset(bits.Data(), 0, (uint64_t)words * dirtyRows * 8);
     uint32_t tailWord = width >> 6, tailBit = width & 63;
-    for (uint32_t y = 0; y < rows; ++y)
+    for (uint32_t y = 0; y < dirtyRows; ++y)
     {
         uint64_t* row = bits.Data() + (uint64_t)y * words;
         row[tailWord] |= ~0ull << tailBit;
         for (uint32_t w = tailWord + 1; w < words; ++w)
             row[w] = ~0ull;
-    }
-    for (uint32_t y = 0; y < rows; ++y)
         longestFree[y] = width;
+    }
     memset(sky.Data(), 0, width * 4ull);
     memset(skyGroup.Data(), 0, (width / skyGroupWidth + 1) * 4ull);
     for (uint32_t n = 0; n <= 64; ++n)
