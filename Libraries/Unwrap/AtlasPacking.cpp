@@ -51,6 +51,7 @@ namespace
     // kCoarseMinTexels wide.
     const double kCoarseChartTexels = 32;
     const double kCoarseMinTexels = 64;
+    const double kCoarseRatio = 3;
     // Below this many triangles the full search on the fine atlas is left out when there is a
     // coarse one: its cost would dwarf the rest of the unwrap.
     const uint32_t kSmallMesh = 1000;
@@ -372,8 +373,8 @@ namespace
     }
 
     // The coarse atlas's side: about kCoarseChartTexels texels across the charts that hold most
-    // of the area (the area-weighted mean side) at `scale`; 0 when that is not well below the
-    // fine atlas (many or small charts: they go straight to the fine atlas).
+    // of the area (the area-weighted mean side) at `scale`; 0 when that is not below the fine
+    // atlas by kCoarseRatio (many or small charts: they go straight to the fine atlas).
     uint32_t CoarseTexels(const ChartInfo* info, uint32_t n, double scale, uint32_t fineTexels)
     {
         double area = 0, weighted = 0;
@@ -383,7 +384,7 @@ namespace
             return 0;
         double texels = kCoarseChartTexels * area / (scale * weighted);
         texels = texels > kCoarseMinTexels ? texels : kCoarseMinTexels;
-        return texels * 2 <= fineTexels ? (uint32_t)texels : 0;
+        return texels * kCoarseRatio <= fineTexels ? (uint32_t)texels : 0;
     }
 
     // The first scale to try: the charts' dilated squares fill 65 % of the atlas.
@@ -555,15 +556,16 @@ namespace
     {
         double scale;
         Variant variant;
+        uint64_t work;   // what the search cost (Packer::work)
     };
 
     // The search on one atlas; the places of the largest scale that fits go into `best`.
     // Without a guide: steps 3 and 4 (every orientation, then the other choices within as much
-    // work again). With one (a coarser atlas's outcome and places): every chart keeps the
+    // work again, less the work `spent` by other searches of the same charts). With one (a coarser atlas's outcome and places): every chart keeps the
     // guide's orientation and order, and only the scale is searched, from the guide's.
     // False when memory runs out.
     bool SearchAtlas(const Charts& charts, const Layout& layout, ChartPlace* trialPlaces, ChartPlace* best,
-                     const Outcome* guide, const ChartPlace* guidePlaces, Outcome* outcome)
+                     const Outcome* guide, const ChartPlace* guidePlaces, uint64_t spent, Outcome* outcome)
     {
         Packer packer(charts.uv, charts.start, charts.members, charts.info, charts.order, charts.turn, charts.count, layout);
         ScaleSearch search = {trialPlaces, best, charts.count, charts.largest, layout};
@@ -576,7 +578,7 @@ namespace
             if (!packer.SetVariant(guide->variant, charts.info, charts.order) ||
                 !search.Climb(packer, guide->scale, kMaxTrials, &low))
                 return false;
-            *outcome = {low, search.bestVariant};
+            *outcome = {low, search.bestVariant, packer.work};
             return true;
         }
         double first = FirstScale(charts.info, charts.count, layout);
@@ -587,15 +589,17 @@ namespace
         // the best found: packing is not monotonic in the scale, least so with few charts.
         // Many charts pack evenly at any scale: they skip it.
         // No floor: a mesh that packed in a few milliseconds never waits for the second search.
+        // What other searches of this packing have spent comes out of it.
         uint64_t extraWork =
             charts.count > kExtraCharts ? 0 : (packer.work < 2 * kExtraWork ? packer.work : 2 * kExtraWork);
+        extraWork = extraWork > spent ? extraWork - spent : 0;
         uint64_t limit = packer.work + extraWork;
         packer.SetStopAboveAtlas(true);
         if (!packer.SetVariant({Order::ByExtent, false}, charts.info, charts.order) ||
             !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
             !search.Refine(packer, charts.info, charts.order, low, limit, &low))
             return false;
-        *outcome = {low, search.bestVariant};
+        *outcome = {low, search.bestVariant, packer.work};
         return true;
     }
 
@@ -664,20 +668,22 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     // wins; on a small mesh (below kSmallMesh triangles) the full fine search, whose trials cost
     // about the atlas's area whatever the input, is left out.
     uint32_t coarseTexels = CoarseTexels(info.Data(), chartCount, FirstScale(info.Data(), chartCount, fine), fine.atlasTexels);
-    Outcome outcome = {0, {Order::ByArea, false}};
+    Outcome outcome = {0, {Order::ByArea, false}, 0};
     Layout layout = fine;
+    uint64_t spent = 0;   // the work of the coarse search and the climb
     if (coarseTexels)
     {
         Layout coarse = ChooseLayout(margin, coarseTexels);
         Outcome coarseOutcome, climbed;
-        if (!SearchAtlas(charts, coarse, trialPlaces.Data(), bestPlaces.Data(), nullptr, nullptr, &coarseOutcome) ||
+        if (!SearchAtlas(charts, coarse, trialPlaces.Data(), bestPlaces.Data(), nullptr, nullptr, 0, &coarseOutcome) ||
             !finePlaces.Allocate(chartCount))
             return (*error = kOutOfMemory), false;
-        outcome = coarseOutcome, layout = coarse;
+        outcome = coarseOutcome, layout = coarse, spent = coarseOutcome.work;
         if (coarseOutcome.scale > 0)
         {
-            if (!SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), &coarseOutcome, bestPlaces.Data(), &climbed))
+            if (!SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), &coarseOutcome, bestPlaces.Data(), 0, &climbed))
                 return (*error = kOutOfMemory), false;
+            spent += climbed.work;
             if (climbed.scale > outcome.scale)
             {
                 outcome = climbed, layout = fine;
@@ -689,7 +695,7 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     {
         Outcome full;
         if (!finePlaces.Allocate(chartCount) ||
-            !SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), nullptr, nullptr, &full))
+            !SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), nullptr, nullptr, spent, &full))
             return (*error = kOutOfMemory), false;
         if (full.scale > outcome.scale)
         {

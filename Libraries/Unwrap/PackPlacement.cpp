@@ -73,7 +73,26 @@ namespace
         return run > best ? run : best;
     }
 
-    bool Fits(const AtlasOccupancy& atlas, const ChartRaster& chart, uint32_t x, uint32_t y)
+    // The first set bit at or below `bit` in the chart row whose run of set bits holds `bit`.
+    uint32_t RunStart(const uint64_t* chartRow, uint32_t bit)
+    {
+        for (uint32_t k = bit >> 6;; --k)
+        {
+            // Clear bits at or below `bit` in word k (all of the word below the first word).
+            uint64_t below = bit >> 6 == k ? ~0ull >> (63 - (bit & 63)) : ~0ull;
+            uint64_t clear = ~chartRow[k] & below;
+            if (clear)
+                return 64 * k + 64 - (uint32_t)__builtin_clzll(clear);
+            if (k == 0)
+                return 0;
+        }
+    }
+
+    // 0 when the chart fits at (x, y); otherwise how far x can move right and still be sure to
+    // collide. With b the highest chart texel of a colliding word, and s the first texel of the
+    // chart row's run of set texels that holds b, the atlas texel x + b is taken: every offset
+    // up to x + b - s puts a texel of [s, b] on it, so the next candidate is x + b - s + 1.
+    uint32_t Collision(const AtlasOccupancy& atlas, const ChartRaster& chart, uint32_t x, uint32_t y)
     {
         // The anchor row first: the likeliest to collide.
         for (uint32_t i = 0; i <= chart.height; ++i)
@@ -84,10 +103,13 @@ namespace
             const uint64_t* atlasRow = &atlas.bits[(uint64_t)(y + r) * atlas.words];
             const uint64_t* chartRow = chart.Row(r);
             for (uint32_t k = chart.spanLow[r] >> 6; k <= chart.spanHigh[r] >> 6; ++k)
-                if (chartRow[k] & Window(atlasRow, x + 64 * k))
-                    return false;
+                if (uint64_t hit = chartRow[k] & Window(atlasRow, x + 64 * k))
+                {
+                    uint32_t b = 64 * k + 63 - (uint32_t)__builtin_clzll(hit);
+                    return b - RunStart(chartRow, b) + 1;
+                }
         }
-        return true;
+        return 0;
     }
     // Bottom-left search of the bitmap for a position whose top lies below topLimit.
     bool HoleSearch(AtlasOccupancy& atlas, const ChartRaster& chart, uint32_t topLimit, Placement* at, int64_t& budget)
@@ -108,10 +130,24 @@ namespace
             uint32_t lowerTop = topLimit - chart.height - 1;   // strictly below the best top so far
             lastY = lowerTop < lastY ? lowerTop : lastY;
         }
+        // The rows with the longest runs, longest first: they rule out most offsets soonest.
+        const uint32_t kDemanding = 8;
+        uint32_t demanding[kDemanding], demandingCount = 0;
+        for (uint32_t r = 0; r < chart.height; ++r)
+        {
+            uint32_t i = demandingCount < kDemanding ? demandingCount++ : kDemanding;
+            for (; i > 0 && chart.rowRun[demanding[i - 1]] < chart.rowRun[r]; --i)
+                if (i < kDemanding)
+                    demanding[i] = demanding[i - 1];
+            if (i < kDemanding)
+                demanding[i] = r;
+        }
         for (uint32_t y = firstY; y <= lastY && budget > 0; ++y, --budget)
         {
             // Every chart row's longest run must find a free run at least as long.
             bool possible = true;
+            for (uint32_t i = 0; i < demandingCount && possible; ++i)
+                possible = atlas.longestFree[y + demanding[i]] >= chart.rowRun[demanding[i]];
             for (uint32_t r = 0; r < chart.height && possible; ++r)
                 possible = atlas.longestFree[y + r] >= chart.rowRun[r];
             if (!possible)
@@ -125,12 +161,16 @@ namespace
                     return false;
                 uint32_t highX = end - 1 - chart.anchorHigh;
                 highX = highX < lastX ? highX : lastX;
-                for (uint32_t x = lowX; x <= highX && budget > 0; ++x, --budget)
-                    if (Fits(atlas, chart, x, y))
+                for (uint32_t x = lowX; x <= highX && budget > 0; --budget)
+                {
+                    uint32_t skip = Collision(atlas, chart, x, y);
+                    if (skip == 0)
                     {
                         *at = {x, y};
                         return true;
                     }
+                    x += skip;
+                }
                 return false;
             });
             if (found)

@@ -22,7 +22,7 @@ const uint32_t kNoTopLimit = 0xFFFFFFFFu;
 // Rows plus positions the hole searches of one trial examine at most, shared out among the
 // charts (all orientations of a chart together), within the per-chart bounds: holes are a
 // refinement, and a crowded atlas could otherwise cost a test at every free texel per chart.
-const int64_t kHoleSearchTrialBudget = 1 << 22;
+const int64_t kHoleSearchTrialBudget = 1 << 21;
 const int64_t kHoleSearchChartBudget[2] = {1024, 16384};
 
 struct AtlasOccupancy
