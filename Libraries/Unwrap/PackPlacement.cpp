@@ -131,10 +131,13 @@ namespace
             lastY = lowerTop < lastY ? lowerTop : lastY;
         }
         // The rows with the longest runs, longest first: they rule out most offsets soonest.
+        // An atlas row whose longest free run is below `shortest`, the shortest run of any chart
+        // row, takes no chart row at all: every offset that puts one on it is skipped.
         const uint32_t kDemanding = 8;
-        uint32_t demanding[kDemanding], demandingCount = 0;
+        uint32_t demanding[kDemanding], demandingCount = 0, shortest = 0xFFFFFFFFu;
         for (uint32_t r = 0; r < chart.height; ++r)
         {
+            shortest = chart.rowRun[r] && chart.rowRun[r] < shortest ? chart.rowRun[r] : shortest;
             uint32_t i = demandingCount < kDemanding ? demandingCount++ : kDemanding;
             for (; i > 0 && chart.rowRun[demanding[i - 1]] < chart.rowRun[r]; --i)
                 if (i < kDemanding)
@@ -145,13 +148,19 @@ namespace
         for (uint32_t y = firstY; y <= lastY && budget > 0; ++y, --budget)
         {
             // Every chart row's longest run must find a free run at least as long.
-            bool possible = true;
-            for (uint32_t i = 0; i < demandingCount && possible; ++i)
-                possible = atlas.longestFree[y + demanding[i]] >= chart.rowRun[demanding[i]];
-            for (uint32_t r = 0; r < chart.height && possible; ++r)
-                possible = atlas.longestFree[y + r] >= chart.rowRun[r];
-            if (!possible)
+            uint32_t blocked = kNoRow;
+            for (uint32_t i = 0; i < demandingCount && blocked == kNoRow; ++i)
+                if (atlas.longestFree[y + demanding[i]] < chart.rowRun[demanding[i]])
+                    blocked = y + demanding[i];
+            for (uint32_t r = 0; r < chart.height && blocked == kNoRow; ++r)
+                if (atlas.longestFree[y + r] < chart.rowRun[r])
+                    blocked = y + r;
+            if (blocked != kNoRow)
+            {
+                if (atlas.longestFree[blocked] < shortest)
+                    y = blocked;   // the loop goes on above it
                 continue;
+            }
             const uint64_t* anchorRow = atlas.bits.Data() + (uint64_t)(y + chart.anchorRow) * atlas.words;
             uint32_t lastX = atlas.width - chart.width;
             bool found = ForEachClearRun(anchorRow, atlas.words - 1, need, [&](uint32_t first, uint32_t end) {
