@@ -55,6 +55,7 @@ namespace
     // Below this many triangles the full search on the fine atlas is left out when there is a
     // coarse one: its cost would dwarf the rest of the unwrap.
     const uint32_t kSmallMesh = 1000;
+    const uint32_t kCoarseMaxCharts = 32;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
     const double kSlack = 1e-6;
     // cos and sin of k * 45 degrees.
@@ -661,13 +662,17 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
         largest = info[c].extent > largest ? info[c].extent : largest;
     Charts charts = {uv, start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, largest};
     // Few large charts: the whole search also runs on a coarse atlas (a typical chart some 32
-    // texels across, so that a trial costs a small fraction of a fine one), and the fine atlas
-    // then climbs from its scale with the coarse winner's orientations and order. The coarse
-    // layout is valid in itself (its texels are wider than half the margin). The two searches
-    // often find different layouts (packing is far from monotonic), so the larger scale of both
-    // wins; on a small mesh (below kSmallMesh triangles) the full fine search, whose trials cost
-    // about the atlas's area whatever the input, is left out.
-    uint32_t coarseTexels = CoarseTexels(info.Data(), chartCount, FirstScale(info.Data(), chartCount, fine), fine.atlasTexels);
+    // texels across, so that a trial costs a small fraction of a fine one in texels; the
+    // triangles cost the same), and the fine atlas then climbs from its scale with the coarse
+    // winner's orientations and order. The coarse layout is valid in itself (its texels are
+    // wider than half the margin). The two searches often find different layouts (packing is
+    // far from monotonic), so the larger scale of both wins; on a small mesh (below kSmallMesh
+    // triangles) the full fine search, whose trials cost about the atlas's area whatever the
+    // input, is left out. Beyond kCoarseMaxCharts charts the coarse search is skipped: many
+    // charts pack evenly, and it would mostly add its cost.
+    uint32_t coarseTexels = chartCount > kCoarseMaxCharts && triCount >= kSmallMesh
+                                ? 0
+                                : CoarseTexels(info.Data(), chartCount, FirstScale(info.Data(), chartCount, fine), fine.atlasTexels);
     Outcome outcome = {0, {Order::ByArea, false}, 0};
     Layout layout = fine;
     uint64_t spent = 0;   // the work of the coarse search and the climb
