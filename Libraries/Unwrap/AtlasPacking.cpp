@@ -56,6 +56,7 @@ namespace
     // coarse one: its cost would dwarf the rest of the unwrap.
     const uint32_t kSmallMesh = 1000;
     const uint32_t kCoarseMaxCharts = 32;
+    const uint32_t kExtraWorkPerTriangle = 256;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
     const double kSlack = 1e-6;
     // cos and sin of k * 45 degrees.
@@ -562,11 +563,13 @@ namespace
 
     // The search on one atlas; the places of the largest scale that fits go into `best`.
     // Without a guide: steps 3 and 4 (every orientation, then the other choices within as much
-    // work again, less the work `spent` by other searches of the same charts). With one (a coarser atlas's outcome and places): every chart keeps the
+    // work again, less the work `spent` by other searches of the same charts, at most extraCap).
+    // With one (a coarser atlas's outcome and places): every chart keeps the
     // guide's orientation and order, and only the scale is searched, from the guide's.
     // False when memory runs out.
     bool SearchAtlas(const Charts& charts, const Layout& layout, ChartPlace* trialPlaces, ChartPlace* best,
-                     const Outcome* guide, const ChartPlace* guidePlaces, uint64_t spent, Outcome* outcome)
+                     const Outcome* guide, const ChartPlace* guidePlaces, uint64_t spent, uint64_t extraCap,
+                     Outcome* outcome)
     {
         Packer packer(charts.uv, charts.start, charts.members, charts.info, charts.order, charts.turn, charts.count, layout);
         ScaleSearch search = {trialPlaces, best, charts.count, charts.largest, layout};
@@ -594,6 +597,7 @@ namespace
         uint64_t extraWork =
             charts.count > kExtraCharts ? 0 : (packer.work < 2 * kExtraWork ? packer.work : 2 * kExtraWork);
         extraWork = extraWork > spent ? extraWork - spent : 0;
+        extraWork = extraWork < extraCap ? extraWork : extraCap;
         uint64_t limit = packer.work + extraWork;
         packer.SetStopAboveAtlas(true);
         if (!packer.SetVariant({Order::ByExtent, false}, charts.info, charts.order) ||
@@ -673,6 +677,8 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     uint32_t coarseTexels = chartCount > kCoarseMaxCharts && triCount >= kSmallMesh
                                 ? 0
                                 : CoarseTexels(info.Data(), chartCount, FirstScale(info.Data(), chartCount, fine), fine.atlasTexels);
+    // On a small mesh the coarse search's optional trials get work in proportion to the input.
+    uint64_t smallCap = triCount < kSmallMesh ? (uint64_t)kExtraWorkPerTriangle * triCount : ~0ull;
     Outcome outcome = {0, {Order::ByArea, false}, 0};
     Layout layout = fine;
     uint64_t spent = 0;   // the work of the coarse search and the climb
@@ -680,13 +686,14 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     {
         Layout coarse = ChooseLayout(margin, coarseTexels);
         Outcome coarseOutcome, climbed;
-        if (!SearchAtlas(charts, coarse, trialPlaces.Data(), bestPlaces.Data(), nullptr, nullptr, 0, &coarseOutcome) ||
+        if (!SearchAtlas(charts, coarse, trialPlaces.Data(), bestPlaces.Data(), nullptr, nullptr, 0, smallCap, &coarseOutcome) ||
             !finePlaces.Allocate(chartCount))
             return (*error = kOutOfMemory), false;
         outcome = coarseOutcome, layout = coarse, spent = coarseOutcome.work;
         if (coarseOutcome.scale > 0)
         {
-            if (!SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), &coarseOutcome, bestPlaces.Data(), 0, &climbed))
+            if (!SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), &coarseOutcome, bestPlaces.Data(), 0, 0,
+                             &climbed))
                 return (*error = kOutOfMemory), false;
             spent += climbed.work;
             if (climbed.scale > outcome.scale)
@@ -700,7 +707,7 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     {
         Outcome full;
         if (!finePlaces.Allocate(chartCount) ||
-            !SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), nullptr, nullptr, spent, &full))
+            !SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), nullptr, nullptr, spent, ~0ull, &full))
             return (*error = kOutOfMemory), false;
         if (full.scale > outcome.scale)
         {
