@@ -27,6 +27,7 @@
 #include "AtlasPacking.h"
 
 #include "PackOrientation.h"
+#include "PackOutline.h"
 #include "PackPlacement.h"
 #include "PackRaster.h"
 #include "Scratch.h"
@@ -57,6 +58,7 @@ namespace
     const uint32_t kSmallMesh = 1000;
     const uint32_t kCoarseMaxCharts = 32;
     const uint32_t kExtraWorkPerTriangle = 256;
+    const uint32_t kOutlineMinTriangles = 16;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
     const double kSlack = 1e-6;
     // cos and sin of k * 45 degrees.
@@ -144,6 +146,14 @@ namespace
         return true;   // an even number of passes: the result is back in `order`
     }
 
+    // Outlines of charts (PackOutline.h): chart c's edges are segments[4 start[c] .. 4 start[c + 1]),
+    // none for a chart drawn from its triangles.
+    struct Outlines
+    {
+        const float* segments;
+        const uint64_t* start;
+    };
+
     class Packer
     {
     public:
@@ -164,9 +174,10 @@ namespace
             return OrderLargestFirst(info, m_ChartCount, to.order, order);
         }
 
-        Packer(const float* uv, const uint32_t* start, const uint32_t* members, const ChartInfo* info, const uint32_t* order,
+        Packer(const float* uv, const uint32_t* start, const uint32_t* members, const Outlines& outlines, const ChartInfo* info,
+               const uint32_t* order,
                uint8_t* turn, uint32_t chartCount, const Layout& layout)
-            : m_UV(uv), m_Start(start), m_Members(members), m_Info(info), m_Order(order), m_Turn(turn), m_ChartCount(chartCount),
+            : m_UV(uv), m_Start(start), m_Members(members), m_Outlines(outlines), m_Info(info), m_Order(order), m_Turn(turn), m_ChartCount(chartCount),
               m_Layout(layout)
         {
         }
@@ -230,8 +241,6 @@ namespace
         {
             if (!m_SearchTurns)
                 return PlaceTurned(c, scale, (int)m_Turn[c], place, memoryOut);
-            const uint32_t* members = m_Members + m_Start[c];
-            uint32_t count = m_Start[c + 1] - m_Start[c];
             int orientations = m_Info[c].extent * scale < 2 * m_Layout.texel ? 2 : kOrientations;
             int step = kOrientations / orientations;
             uint32_t bestTop = kNoTopLimit;
@@ -240,9 +249,7 @@ namespace
             for (int k = 0; k < kOrientations; k += step)
             {
                 ChartRaster& raster = m_Raster[m_Current];
-                bool drawn = RasterizeChart(m_UV, members, count, Pose(c, k, scale), m_Layout.atlasTexels, &raster);
-                Account(raster, count);
-                if (!drawn)
+                if (!Draw(c, k, scale, raster))
                 {
                     if (raster.outOfMemory)
                         return (*memoryOut = true), -1;
@@ -269,10 +276,7 @@ namespace
         int PlaceTurned(uint32_t c, double scale, int k, ChartPlace* place, bool* memoryOut)
         {
             ChartRaster& raster = m_Raster[0];
-            bool drawn = RasterizeChart(m_UV, m_Members + m_Start[c], m_Start[c + 1] - m_Start[c], Pose(c, k, scale),
-                                        m_Layout.atlasTexels, &raster);
-            Account(raster, m_Start[c + 1] - m_Start[c]);
-            if (!drawn)
+            if (!Draw(c, k, scale, raster))
                 return (*memoryOut = raster.outOfMemory), -1;
             Placement at;
             if (!FindPlacement(m_Atlas, raster, kNoTopLimit, &at, &m_HoleBudget))
@@ -282,10 +286,17 @@ namespace
             return k;
         }
 
-        // The work of drawing a chart and searching its skyline, in the units of the hole budget.
-        void Account(const ChartRaster& raster, uint32_t triangles)
+        // Draws chart c in orientation k, from its outline when it has one, and counts the work
+        // (the triangles or edges, the words and the skyline's columns, in the units of the hole
+        // budget). False as RasterizeChart.
+        bool Draw(uint32_t c, int k, double scale, ChartRaster& raster)
         {
-            work += triangles + (uint64_t)raster.words * raster.height + raster.width;
+            uint32_t count = m_Start[c + 1] - m_Start[c];
+            uint32_t segments = (uint32_t)(m_Outlines.start[c + 1] - m_Outlines.start[c]);
+            bool drawn = RasterizeChart(m_UV, m_Members + m_Start[c], count, m_Outlines.segments + 4 * m_Outlines.start[c],
+                                        segments, Pose(c, k, scale), m_Layout.atlasTexels, &raster);
+            work += (segments ? segments : count) + (uint64_t)raster.words * raster.height + raster.width;
+            return drawn;
         }
 
         RasterPose Pose(uint32_t c, int k, double scale) const
@@ -298,6 +309,7 @@ namespace
         const float* m_UV;
         const uint32_t* m_Start;
         const uint32_t* m_Members;
+        Outlines m_Outlines;
         const ChartInfo* m_Info;
         const uint32_t* m_Order;
         uint8_t* m_Turn;   // each chart's orientation from the last trial that searched them all
@@ -350,6 +362,33 @@ namespace
             info[c].extent = maxU - minU > maxV - minV ? maxU - minU : maxV - minV;
             if (!MinimumBoxTurn(uv, members + start[c], start[c + 1] - start[c], hull, &info[c].cosine, &info[c].sine))
                 return false;
+        }
+        return true;
+    }
+
+    // Outlines for the charts of at least kOutlineMinTriangles whose boundary has at most half as
+    // many edges as they have triangles (drawing costs an edge about what it costs a triangle).
+    bool BuildOutlines(const float* uv, const uint32_t* start, const uint32_t* members, uint32_t chartCount,
+                       Scratch<float>& outline, Scratch<uint64_t>& outlineStart)
+    {
+        if (!outlineStart.Allocate(chartCount + 1ull))
+            return false;
+        OutlineScratch scratch;
+        uint64_t count = 0, room = 0;
+        outlineStart[0] = 0;
+        for (uint32_t c = 0; c < chartCount; ++c)
+        {
+            uint32_t triangles = start[c + 1] - start[c];
+            if (triangles >= kOutlineMinTriangles)
+            {
+                uint64_t before = count;
+                bool outOfMemory;
+                uint32_t edges = AppendOutline(uv, members + start[c], triangles, scratch, outline, &count, &room, &outOfMemory);
+                if (outOfMemory)
+                    return false;
+                count = 2ull * edges <= triangles ? count : before;
+            }
+            outlineStart[c + 1] = count;
         }
         return true;
     }
@@ -551,6 +590,7 @@ namespace
         uint8_t* turn;     // each chart's orientation when the turns are not searched
         uint32_t count;
         double largest;    // the largest chart extent
+        Outlines outlines;
     };
 
     // A search's result: the largest scale that fitted (0: none) and the variant it was packed with.
@@ -571,7 +611,7 @@ namespace
                      const Outcome* guide, const ChartPlace* guidePlaces, uint64_t spent, uint64_t extraCap,
                      Outcome* outcome)
     {
-        Packer packer(charts.uv, charts.start, charts.members, charts.info, charts.order, charts.turn, charts.count, layout);
+        Packer packer(charts.uv, charts.start, charts.members, charts.outlines, charts.info, charts.order, charts.turn, charts.count, layout);
         ScaleSearch search = {trialPlaces, best, charts.count, charts.largest, layout};
         double low = 0;
         if (guide)
@@ -664,7 +704,12 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     double largest = 0;
     for (uint32_t c = 0; c < chartCount; ++c)
         largest = info[c].extent > largest ? info[c].extent : largest;
-    Charts charts = {uv, start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, largest};
+    Scratch<float> outline;
+    Scratch<uint64_t> outlineStart;
+    if (!BuildOutlines(uv, start.Data(), members.Data(), chartCount, outline, outlineStart))
+        return (*error = kOutOfMemory), false;
+    Charts charts = {uv,        start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, largest,
+                     {outline.Data(), outlineStart.Data()}};
     // Few large charts: the whole search also runs on a coarse atlas (a typical chart some 32
     // texels across, so that a trial costs a small fraction of a fine one in texels; the
     // triangles cost the same), and the fine atlas then climbs from its scale with the coarse
