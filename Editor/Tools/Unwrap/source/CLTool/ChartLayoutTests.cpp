@@ -664,17 +664,21 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
 
     TEST_FIXTURE(ChartsFixture, Holes_SmallChartsFillTheHoleOfAFrame)
     {
-        // A flat square frame (4 x 4 unit quads without the middle 2 x 2) and twelve loose
-        // squares of side 0.4 in other planes. The frame spans the square's side; the squares
-        // fit only into its hole, which the skyline cannot reach: the hole search must find it.
+        // A flat square frame (16 x 16 quads of side 0.25 without the middle 8 x 8: a chart of
+        // many triangles, drawn from its outline, inner edges included) and twelve loose squares
+        // of side 0.4 in other planes. The frame spans the square's side; the squares fit only
+        // into its hole, which the skyline cannot reach: the hole search must find it, and the
+        // frame's drawing must leave it empty.
         Mesh mesh;
-        uint32_t grid[5][5];
-        for (int i = 0; i < 5; ++i)
-            for (int j = 0; j < 5; ++j)
-                grid[i][j] = mesh.Add(float(i), float(j), 0);
-        for (int i = 0; i < 4; ++i)
-            for (int j = 0; j < 4; ++j)
-                if (!(i >= 1 && i <= 2 && j >= 1 && j <= 2))
+        const int n = 16;
+        uint32_t grid[n + 1][n + 1];
+        for (int i = 0; i <= n; ++i)
+            for (int j = 0; j <= n; ++j)
+                grid[i][j] = mesh.Add(0.25f * i, 0.25f * j, 0);
+        auto inHole = [](int i, int j) { return i >= n / 4 && i < 3 * n / 4 && j >= n / 4 && j < 3 * n / 4; };
+        for (int i = 0; i < n; ++i)
+            for (int j = 0; j < n; ++j)
+                if (!inHole(i, j))
                     mesh.Face(grid[i][j], grid[i + 1][j], grid[i + 1][j + 1]), mesh.Face(grid[i][j], grid[i + 1][j + 1], grid[i][j + 1]);
         const uint32_t frameTriangles = mesh.TriCount();
         for (int k = 0; k < 12; ++k)
@@ -688,7 +692,7 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
         if (layout.uv.empty())
             return;
         CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, true));
-        // The hole's corners in UV: the frame's inner grid points.
+        // The hole's corners in UV: the frame's inner grid points at 1 and 3.
         double low[2] = {1, 1}, high[2] = {0, 0};
         for (uint32_t t = 0; t < frameTriangles; ++t)
             for (int c = 0; c < 3; ++c)
