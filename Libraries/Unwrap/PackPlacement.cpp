@@ -133,7 +133,7 @@ namespace
         // The rows with the longest runs, longest first: they rule out most offsets soonest.
         // An atlas row whose longest free run is below `shortest`, the shortest run of any chart
         // row, takes no chart row at all: every offset that puts one on it is skipped.
-        const uint32_t kDemanding = 8;
+        const uint32_t kDemanding = 8, kRowsPerUnit = 16;
         uint32_t demanding[kDemanding], demandingCount = 0, shortest = 0xFFFFFFFFu;
         for (uint32_t r = 0; r < chart.height; ++r)
         {
@@ -147,20 +147,24 @@ namespace
         }
         for (uint32_t y = firstY; y <= lastY && budget > 0; ++y, --budget)
         {
-            // Every chart row's longest run must find a free run at least as long.
-            uint32_t blocked = kNoRow;
-            for (uint32_t i = 0; i < demandingCount && blocked == kNoRow; ++i)
+            // Every chart row's longest run must find a free run at least as long. The budget
+            // pays for the rows read, a unit for every kRowsPerUnit (a test of a position
+            // costs about that many).
+            uint32_t blocked = kNoRow, rowsRead = 0;
+            for (uint32_t i = 0; i < demandingCount && blocked == kNoRow; ++i, ++rowsRead)
                 if (atlas.longestFree[y + demanding[i]] < chart.rowRun[demanding[i]])
                     blocked = y + demanding[i];
-            for (uint32_t r = 0; r < chart.height && blocked == kNoRow; ++r)
+            for (uint32_t r = 0; r < chart.height && blocked == kNoRow; ++r, ++rowsRead)
                 if (atlas.longestFree[y + r] < chart.rowRun[r])
                     blocked = y + r;
+            budget -= rowsRead / kRowsPerUnit;
             if (blocked != kNoRow)
             {
                 if (atlas.longestFree[blocked] < shortest)
                     y = blocked;   // the loop goes on above it
                 continue;
             }
+            budget -= atlas.words / kRowsPerUnit;   // the anchor row's free runs
             const uint64_t* anchorRow = atlas.bits.Data() + (uint64_t)(y + chart.anchorRow) * atlas.words;
             uint32_t lastX = atlas.width - chart.width;
             bool found = ForEachClearRun(anchorRow, atlas.words - 1, need, [&](uint32_t first, uint32_t end) {
