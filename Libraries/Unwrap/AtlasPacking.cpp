@@ -1,7 +1,8 @@
 // Packing, orchestration (the contract is in AtlasPacking.h).
 //
 // 1. Group the triangles by chart; measure each chart's area and its starting orientation
-//    (PackOrientation); order the charts largest first.
+//    (PackOrientation); find the outline of the charts of many triangles (PackOutline); order
+//    the charts largest first.
 // 2. For a trial scale, pack every chart (PackRaster, PackPlacement) into a strip as wide as the
 //    atlas and twice as high, in each of 8 orientations (the minimum-area box one and its turns by
 //    45 degrees; 2 for charts under two texels), keeping the orientation with the lowest top.
@@ -15,15 +16,20 @@
 //    longest side, then scales in 0.5 % steps above the best, each tried in turn with the two
 //    orders and the skyline's two choices (lowest, least waste) until one fits. The largest
 //    scale that fitted wins.
-// 5. Move every corner to its chart's place.
+// 5. Few large charts (up to kCoarseMaxCharts, or a mesh under kSmallMesh triangles): steps 2 to
+//    4 run first on a coarse atlas (CoarseTexels), then the fine atlas climbs from the coarse
+//    scale with the coarse winner's orientations and order (ScaleSearch::Climb); steps 2 to 4 on
+//    the fine atlas follow except on a small mesh, their optional trials reduced by the work
+//    already spent. The largest scale of all wins, with the atlas it was found on.
+// 6. Move every corner to its chart's place.
 //
 // The margin: charts are drawn conservatively and dilated by whole texels covering half the
 // margin plus a slack for float rounding, and the atlas bitmap is inset by at least as much from
 // the square's border, so charts whose bitmaps share no texel are at least the margin apart and
-// from the border. The finished UVs are checked against the border once more.
-// Each trial costs the rows of every triangle in every orientation tried, plus the placement
-// searches (bounded, see PackPlacement.h); at most kMaxTrials trials in the first search, then the
-// budget of step 4.
+// from the border (on either atlas). The finished UVs are checked against the border once more.
+// Each trial costs the rows of every triangle (or outline edge) in every orientation tried, plus
+// the placement searches (bounded, see PackPlacement.h); at most kMaxTrials trials in the first
+// search, then the budget of step 4.
 #include "AtlasPacking.h"
 
 #include "PackOrientation.h"
@@ -48,16 +54,19 @@ namespace
     // drawing of a chart some kCoarseChartTexels across costs.
     const double kClimbStep = 1.04;
     const int kOrientations = 8;
-    // The coarse atlas draws a typical chart about this many texels across, and is at least
-    // kCoarseMinTexels wide.
+    // The coarse atlas draws a typical chart about this many texels across, is at least
+    // kCoarseMinTexels wide, and is used only when the fine one is kCoarseRatio times as wide.
     const double kCoarseChartTexels = 32;
     const double kCoarseMinTexels = 64;
     const double kCoarseRatio = 3;
     // Below this many triangles the full search on the fine atlas is left out when there is a
-    // coarse one: its cost would dwarf the rest of the unwrap.
+    // coarse one (its cost would dwarf the rest of the unwrap), and the coarse search's optional
+    // trials get kExtraWorkPerTriangle work units a triangle. Above it, the coarse search is
+    // made for at most kCoarseMaxCharts charts.
     const uint32_t kSmallMesh = 1000;
-    const uint32_t kCoarseMaxCharts = 32;
     const uint32_t kExtraWorkPerTriangle = 256;
+    const uint32_t kCoarseMaxCharts = 32;
+    // Charts of at least this many triangles are drawn from their outline when it is short.
     const uint32_t kOutlineMinTriangles = 16;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
     const double kSlack = 1e-6;
@@ -175,10 +184,9 @@ namespace
         }
 
         Packer(const float* uv, const uint32_t* start, const uint32_t* members, const Outlines& outlines, const ChartInfo* info,
-               const uint32_t* order,
-               uint8_t* turn, uint32_t chartCount, const Layout& layout)
-            : m_UV(uv), m_Start(start), m_Members(members), m_Outlines(outlines), m_Info(info), m_Order(order), m_Turn(turn), m_ChartCount(chartCount),
-              m_Layout(layout)
+               const uint32_t* order, uint8_t* turn, uint32_t chartCount, const Layout& layout)
+            : m_UV(uv), m_Start(start), m_Members(members), m_Outlines(outlines), m_Info(info), m_Order(order), m_Turn(turn),
+              m_ChartCount(chartCount), m_Layout(layout)
         {
         }
 
@@ -611,7 +619,8 @@ namespace
                      const Outcome* guide, const ChartPlace* guidePlaces, uint64_t spent, uint64_t extraCap,
                      Outcome* outcome)
     {
-        Packer packer(charts.uv, charts.start, charts.members, charts.outlines, charts.info, charts.order, charts.turn, charts.count, layout);
+        Packer packer(charts.uv, charts.start, charts.members, charts.outlines, charts.info, charts.order, charts.turn,
+                      charts.count, layout);
         ScaleSearch search = {trialPlaces, best, charts.count, charts.largest, layout};
         double low = 0;
         if (guide)
