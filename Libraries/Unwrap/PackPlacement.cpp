@@ -148,8 +148,8 @@ namespace
         for (uint32_t y = firstY; y <= lastY && budget > 0; ++y, --budget)
         {
             // Every chart row's longest run must find a free run at least as long. The budget
-            // pays for the rows read, a unit for every kRowsPerUnit (a test of a position
-            // costs about that many).
+            // pays for the rows read, a unit for every kRowsPerUnit (about what a test of a
+            // position costs).
             uint32_t blocked = kNoRow, rowsRead = 0;
             for (uint32_t i = 0; i < demandingCount && blocked == kNoRow; ++i, ++rowsRead)
                 if (atlas.longestFree[y + demanding[i]] < chart.rowRun[demanding[i]])
