@@ -496,6 +496,17 @@ namespace
             memcpy(best, trialPlaces, (uint64_t)chartCount * sizeof(ChartPlace));
         }
 
+        // Packs at `scale`; a fit above the best scale so far becomes the best. False when
+        // memory runs out.
+        bool TryScale(Packer& packer, double scale, bool searchTurns, Trial* trial, double* bestScale)
+        {
+            if (!packer.Pack(scale, searchTurns, trialPlaces, trial))
+                return false;
+            if (Fits(*trial) && scale > *bestScale)
+                Keep(packer, scale, bestScale);
+            return true;
+        }
+
         // From `scale`, at most `trials` packs, each used height predicting the next scale;
         // stops when success and failure are within kScaleTolerance or the packer's work reaches
         // workLimit. False when memory runs out.
@@ -507,14 +518,10 @@ namespace
                 Trial trial;
                 bool searchTurns = turnsScale == 0 || scale > turnsScale * 1.05 || scale < turnsScale / 1.05;
                 turnsScale = searchTurns ? scale : turnsScale;
-                if (!packer.Pack(scale, searchTurns, trialPlaces, &trial))
+                if (!TryScale(packer, scale, searchTurns, &trial, bestScale))
                     return false;
                 if (Fits(trial))
-                {
                     low = scale;
-                    if (scale > *bestScale)
-                        Keep(packer, scale, bestScale);
-                }
                 else
                 {
                     high = scale;
@@ -539,16 +546,9 @@ namespace
             {
                 double scale = high > 0 ? Sqrt(low * high) : low * kClimbStep;
                 Trial trial;
-                if (!packer.Pack(scale, false, trialPlaces, &trial))
+                if (!TryScale(packer, scale, false, &trial, bestScale))
                     return false;
-                if (Fits(trial))
-                {
-                    low = scale;
-                    if (scale > *bestScale)
-                        Keep(packer, scale, bestScale);
-                }
-                else
-                    high = scale;
+                *(Fits(trial) ? &low : &high) = scale;
             }
             return true;
         }
@@ -574,13 +574,10 @@ namespace
                     if (!packer.SetVariant({variant & 1 ? Order::ByExtent : Order::ByArea, variant >= 2}, info, order))
                         return false;
                     Trial trial;
-                    if (!packer.Pack(scale, true, trialPlaces, &trial))
+                    if (!TryScale(packer, scale, true, &trial, bestScale))
                         return false;
                     if (Fits(trial))
-                    {
-                        Keep(packer, scale, bestScale);
                         break;
-                    }
                 }
             }
             return true;
