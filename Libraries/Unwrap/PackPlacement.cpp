@@ -216,7 +216,12 @@ namespace
         if (w > width)
             return false;
         // Group widths are multiples of the atlas's base group, whose highest skies it keeps.
-        uint32_t base = atlas.skyGroupWidth, perGroup = ((w + 63) / 64 + base - 1) / base;
+        // The two phases cost (width / g) (w / g) and 4 g w: least near g = cube root of width / 2
+        // (8 on a 1024-texel atlas), more when the chart needs it.
+        uint32_t base = atlas.skyGroupWidth, perGroup = ((w + 63) / 64 + base - 1) / base, balanced = 1;
+        while ((balanced + 1) * (balanced + 1) * (balanced + 1) <= width / 2)
+            ++balanced;
+        perGroup = perGroup * base >= balanced ? perGroup : (balanced + base - 1) / base;
         uint32_t g = base * perGroup;
         uint32_t groups = (w + g - 1) / g, atlasGroups = (width + g - 1) / g, baseGroups = (width + base - 1) / base;
         int64_t bottom[65], sky[257];
