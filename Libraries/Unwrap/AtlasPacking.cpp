@@ -1,7 +1,8 @@
 // Packing, orchestration (the contract is in AtlasPacking.h).
 //
 // 1. Group the triangles by chart; measure each chart's area and its starting orientation
-//    (PackOrientation); order the charts largest first.
+//    (PackOrientation); find the outline of the charts of many triangles (PackOutline); order
+//    the charts largest first.
 // 2. For a trial scale, pack every chart (PackRaster, PackPlacement) into a strip as wide as the
 //    atlas and twice as high, in each of 8 orientations (the minimum-area box one and its turns by
 //    45 degrees; 2 for charts under two texels), keeping the orientation with the lowest top.
@@ -15,18 +16,24 @@
 //    longest side, then scales in 0.5 % steps above the best, each tried in turn with the two
 //    orders and the skyline's two choices (lowest, least waste) until one fits. The largest
 //    scale that fitted wins.
-// 5. Move every corner to its chart's place.
+// 5. Few large charts (up to kCoarseMaxCharts, or a mesh under kSmallMesh triangles): steps 2 to
+//    4 run first on a coarse atlas (CoarseTexels), then the fine atlas climbs from the coarse
+//    scale with the coarse winner's orientations and order (ScaleSearch::Climb); steps 2 to 4 on
+//    the fine atlas follow except on a small mesh, their optional trials reduced by the work
+//    already spent. The largest scale of all wins, with the atlas it was found on.
+// 6. Move every corner to its chart's place.
 //
 // The margin: charts are drawn conservatively and dilated by whole texels covering half the
 // margin plus a slack for float rounding, and the atlas bitmap is inset by at least as much from
 // the square's border, so charts whose bitmaps share no texel are at least the margin apart and
-// from the border. The finished UVs are checked against the border once more.
-// Each trial costs the rows of every triangle in every orientation tried, plus the placement
-// searches (bounded, see PackPlacement.h); at most kMaxTrials trials in the first search, then the
-// budget of step 4.
+// from the border (on either atlas). The finished UVs are checked against the border once more.
+// Each trial costs the rows of every triangle (or outline edge) in every orientation tried, plus
+// the placement searches (bounded, see PackPlacement.h); at most kMaxTrials trials in the first
+// search, then the budget of step 4.
 #include "AtlasPacking.h"
 
 #include "PackOrientation.h"
+#include "PackOutline.h"
 #include "PackPlacement.h"
 #include "PackRaster.h"
 #include "Scratch.h"
@@ -43,7 +50,24 @@ namespace
     const uint32_t kExtraCharts = 2000;     // more charts than this: no optional trials
     const uint64_t kExtraWork = 1u << 22;   // the optional trials spend at most twice this (see Packer::work)
     const double kScaleTolerance = 1.01;   // the search stops when success and failure are this close
+    // The fine atlas's first step above the coarse atlas's scale: about what its fatter
+    // drawing of a chart some kCoarseChartTexels across costs.
+    const double kClimbStep = 1.04;
     const int kOrientations = 8;
+    // The coarse atlas draws a typical chart about this many texels across, is at least
+    // kCoarseMinTexels wide, and is used only when the fine one is kCoarseRatio times as wide.
+    const double kCoarseChartTexels = 32;
+    const double kCoarseMinTexels = 64;
+    const double kCoarseRatio = 3;
+    // Below this many triangles the full search on the fine atlas is left out when there is a
+    // coarse one (its cost would dwarf the rest of the unwrap), and the coarse search's optional
+    // trials get kExtraWorkPerTriangle work units a triangle. Above it, the coarse search is
+    // made for at most kCoarseMaxCharts charts.
+    const uint32_t kSmallMesh = 1000;
+    const uint32_t kExtraWorkPerTriangle = 256;
+    const uint32_t kCoarseMaxCharts = 32;
+    // Charts of at least this many triangles are drawn from their outline when it is short.
+    const uint32_t kOutlineMinTriangles = 16;
     // Added to half the margin: covers the rounding of the final UVs to float (below 1e-7).
     const double kSlack = 1e-6;
     // cos and sin of k * 45 degrees.
@@ -90,11 +114,19 @@ namespace
         ByExtent
     };
 
-    // Charts by decreasing key, ties by number: stable LSD radix sort on the float bits.
+    // The choices a trial is packed with besides the scale and the orientations.
+    struct Variant
+    {
+        Order order;
+        bool minimizeWaste;   // the skyline's choice (see AtlasOccupancy::minimizeWaste)
+    };
+
+    // Charts by decreasing key, ties by number: stable LSD radix sort on the float bits, a byte a
+    // pass (the count array stays small, so a few charts sort in a few hundred steps).
     bool OrderLargestFirst(const ChartInfo* info, uint32_t n, Order by, uint32_t* order)
     {
-        Scratch<uint32_t> keys, other, count;
-        if (!keys.Allocate(n) || !other.Allocate(n) || !count.Allocate(65537))
+        Scratch<uint32_t> keys, other;
+        if (!keys.Allocate(n) || !other.Allocate(n))
             return false;
         for (uint32_t c = 0; c < n; ++c)
         {
@@ -106,21 +138,30 @@ namespace
         }
         uint32_t* from = order;
         uint32_t* to = other.Data();
-        for (int shift = 0; shift < 32; shift += 16)
+        uint32_t count[257];
+        for (int shift = 0; shift < 32; shift += 8)
         {
-            memset(count.Data(), 0, 65537 * sizeof(uint32_t));
+            memset(count, 0, sizeof(count));
             for (uint32_t i = 0; i < n; ++i)
-                ++count[((keys[from[i]] >> shift) & 0xFFFF) + 1];
-            for (uint32_t d = 0; d < 65536; ++d)
+                ++count[((keys[from[i]] >> shift) & 0xFF) + 1];
+            for (uint32_t d = 0; d < 256; ++d)
                 count[d + 1] += count[d];
             for (uint32_t i = 0; i < n; ++i)
-                to[count[(keys[from[i]] >> shift) & 0xFFFF]++] = from[i];
+                to[count[(keys[from[i]] >> shift) & 0xFF]++] = from[i];
             uint32_t* swap = from;
             from = to;
             to = swap;
         }
-        return true;   // two passes: the result is back in `order`
+        return true;   // an even number of passes: the result is back in `order`
     }
+
+    // Outlines of charts (PackOutline.h): chart c's edges are segments[4 start[c] .. 4 start[c + 1]),
+    // none for a chart drawn from its triangles.
+    struct Outlines
+    {
+        const float* segments;
+        const uint64_t* start;
+    };
 
     class Packer
     {
@@ -131,13 +172,21 @@ namespace
         // only the share placed, not the height used).
         void SetStopAboveAtlas(bool on) { m_StopAboveAtlas = on; }
 
-        // The skyline's choice (see AtlasOccupancy::minimizeWaste); Reset keeps it.
-        void SetMinimizeWaste(bool on) { m_Atlas.minimizeWaste = on; }
+        Variant variant = {Order::ByArea, false};   // the charts' order and the skyline's choice
 
-        Packer(const float* uv, const uint32_t* start, const uint32_t* members, const ChartInfo* info, const uint32_t* order,
-               uint8_t* turn, uint32_t chartCount, const Layout& layout)
-            : m_UV(uv), m_Start(start), m_Members(members), m_Info(info), m_Order(order), m_Turn(turn), m_ChartCount(chartCount),
-              m_Layout(layout)
+        // Orders the charts (into `order`, which the packer reads) and sets the skyline's choice
+        // (see AtlasOccupancy::minimizeWaste; Reset keeps it). False when memory runs out.
+        bool SetVariant(Variant to, const ChartInfo* info, uint32_t* order)
+        {
+            variant = to;
+            m_Atlas.minimizeWaste = to.minimizeWaste;
+            return OrderLargestFirst(info, m_ChartCount, to.order, order);
+        }
+
+        Packer(const float* uv, const uint32_t* start, const uint32_t* members, const Outlines& outlines, const ChartInfo* info,
+               const uint32_t* order, uint8_t* turn, uint32_t chartCount, const Layout& layout)
+            : m_UV(uv), m_Start(start), m_Members(members), m_Outlines(outlines), m_Info(info), m_Order(order), m_Turn(turn),
+              m_ChartCount(chartCount), m_Layout(layout)
         {
         }
 
@@ -200,8 +249,6 @@ namespace
         {
             if (!m_SearchTurns)
                 return PlaceTurned(c, scale, (int)m_Turn[c], place, memoryOut);
-            const uint32_t* members = m_Members + m_Start[c];
-            uint32_t count = m_Start[c + 1] - m_Start[c];
             int orientations = m_Info[c].extent * scale < 2 * m_Layout.texel ? 2 : kOrientations;
             int step = kOrientations / orientations;
             uint32_t bestTop = kNoTopLimit;
@@ -210,9 +257,7 @@ namespace
             for (int k = 0; k < kOrientations; k += step)
             {
                 ChartRaster& raster = m_Raster[m_Current];
-                bool drawn = RasterizeChart(m_UV, members, count, Pose(c, k, scale), m_Layout.atlasTexels, &raster);
-                Account(raster, count);
-                if (!drawn)
+                if (!Draw(c, k, scale, raster))
                 {
                     if (raster.outOfMemory)
                         return (*memoryOut = true), -1;
@@ -239,10 +284,7 @@ namespace
         int PlaceTurned(uint32_t c, double scale, int k, ChartPlace* place, bool* memoryOut)
         {
             ChartRaster& raster = m_Raster[0];
-            bool drawn = RasterizeChart(m_UV, m_Members + m_Start[c], m_Start[c + 1] - m_Start[c], Pose(c, k, scale),
-                                        m_Layout.atlasTexels, &raster);
-            Account(raster, m_Start[c + 1] - m_Start[c]);
-            if (!drawn)
+            if (!Draw(c, k, scale, raster))
                 return (*memoryOut = raster.outOfMemory), -1;
             Placement at;
             if (!FindPlacement(m_Atlas, raster, kNoTopLimit, &at, &m_HoleBudget))
@@ -252,10 +294,17 @@ namespace
             return k;
         }
 
-        // The work of drawing a chart and searching its skyline, in the units of the hole budget.
-        void Account(const ChartRaster& raster, uint32_t triangles)
+        // Draws chart c in orientation k, from its outline when it has one, and counts the work
+        // (the triangles or edges, the words and the skyline's columns, in the units of the hole
+        // budget). False as RasterizeChart.
+        bool Draw(uint32_t c, int k, double scale, ChartRaster& raster)
         {
-            work += triangles + (uint64_t)raster.words * raster.height + raster.width;
+            uint32_t count = m_Start[c + 1] - m_Start[c];
+            uint32_t segments = (uint32_t)(m_Outlines.start[c + 1] - m_Outlines.start[c]);
+            bool drawn = RasterizeChart(m_UV, m_Members + m_Start[c], count, m_Outlines.segments + 4 * m_Outlines.start[c],
+                                        segments, Pose(c, k, scale), m_Layout.atlasTexels, &raster);
+            work += (segments ? segments : count) + (uint64_t)raster.words * raster.height + raster.width;
+            return drawn;
         }
 
         RasterPose Pose(uint32_t c, int k, double scale) const
@@ -268,6 +317,7 @@ namespace
         const float* m_UV;
         const uint32_t* m_Start;
         const uint32_t* m_Members;
+        Outlines m_Outlines;
         const ChartInfo* m_Info;
         const uint32_t* m_Order;
         uint8_t* m_Turn;   // each chart's orientation from the last trial that searched them all
@@ -324,13 +374,42 @@ namespace
         return true;
     }
 
-    // The atlas bitmap: about 1024 texels a side, more for many charts (whose dilated outlines
-    // then waste less of the margin), with the texel chosen so that a whole number of texels
-    // covers half the margin; what is left of the square's side goes into the inset.
-    Layout ChooseLayout(double margin, uint32_t chartCount)
+    // Outlines for the charts of at least kOutlineMinTriangles whose boundary has at most half as
+    // many edges as they have triangles (drawing costs an edge about what it costs a triangle).
+    bool BuildOutlines(const float* uv, const uint32_t* start, const uint32_t* members, uint32_t chartCount,
+                       Scratch<float>& outline, Scratch<uint64_t>& outlineStart)
+    {
+        if (!outlineStart.Allocate(chartCount + 1ull))
+            return false;
+        OutlineScratch scratch;
+        uint64_t count = 0, room = 0;
+        outlineStart[0] = 0;
+        for (uint32_t c = 0; c < chartCount; ++c)
+        {
+            uint32_t triangles = start[c + 1] - start[c];
+            if (triangles >= kOutlineMinTriangles)
+            {
+                uint64_t before = count;
+                bool outOfMemory;
+                uint32_t edges = AppendOutline(uv, members + start[c], triangles, scratch, outline, &count, &room, &outOfMemory);
+                if (outOfMemory)
+                    return false;
+                count = 2ull * edges <= triangles ? count : before;
+            }
+            outlineStart[c + 1] = count;
+        }
+        return true;
+    }
+
+    // The atlas bitmap's side: about 1024 texels, more for many charts (whose dilated outlines
+    // then waste less of the margin).
+    uint32_t FineTexels(uint32_t chartCount) { return chartCount <= 1000 ? 1024 : (chartCount <= 8000 ? 2048 : 4096); }
+
+    // The atlas bitmap for about `target` texels a side, with the texel chosen so that a whole
+    // number of texels covers half the margin; what is left of the square's side goes into the inset.
+    Layout ChooseLayout(double margin, uint32_t target)
     {
         double half = margin / 2 + kSlack;
-        uint32_t target = chartCount <= 1000 ? 1024 : (chartCount <= 8000 ? 2048 : 4096);
         double plain = (1 - 2 * half) / target;
         Layout layout;
         layout.dilationTexels = half <= plain ? 1 : (uint32_t)(half / plain + 0.5);
@@ -340,6 +419,21 @@ namespace
             --layout.atlasTexels;
         layout.inset = (1 - layout.atlasTexels * layout.texel) / 2;
         return layout;
+    }
+
+    // The coarse atlas's side: about kCoarseChartTexels texels across the charts that hold most
+    // of the area (the area-weighted mean side) at `scale`; 0 when that is not below the fine
+    // atlas by kCoarseRatio (many or small charts: they go straight to the fine atlas).
+    uint32_t CoarseTexels(const ChartInfo* info, uint32_t n, double scale, uint32_t fineTexels)
+    {
+        double area = 0, weighted = 0;
+        for (uint32_t c = 0; c < n; ++c)
+            area += info[c].area, weighted += info[c].area * Sqrt(info[c].area);
+        if (!(area > 0 && scale > 0))
+            return 0;
+        double texels = kCoarseChartTexels * area / (scale * weighted);
+        texels = texels > kCoarseMinTexels ? texels : kCoarseMinTexels;
+        return texels * kCoarseRatio <= fineTexels ? (uint32_t)texels : 0;
     }
 
     // The first scale to try: the charts' dilated squares fill 65 % of the atlas.
@@ -391,18 +485,32 @@ namespace
         double largest;   // the largest chart extent
         Layout layout;
 
+        Variant bestVariant = {Order::ByArea, false};   // how the best layout was packed
+
         bool Fits(const Trial& trial) const { return trial.placedAll && trial.usedRows <= layout.atlasTexels; }
 
-        void Keep(double scale, double* bestScale) const
+        void Keep(const Packer& packer, double scale, double* bestScale)
         {
             *bestScale = scale;
+            bestVariant = packer.variant;
             memcpy(best, trialPlaces, (uint64_t)chartCount * sizeof(ChartPlace));
+        }
+
+        // Packs at `scale`; a fit above the best scale so far becomes the best. False when
+        // memory runs out.
+        bool TryScale(Packer& packer, double scale, bool searchTurns, Trial* trial, double* bestScale)
+        {
+            if (!packer.Pack(scale, searchTurns, trialPlaces, trial))
+                return false;
+            if (Fits(*trial) && scale > *bestScale)
+                Keep(packer, scale, bestScale);
+            return true;
         }
 
         // From `scale`, at most `trials` packs, each used height predicting the next scale;
         // stops when success and failure are within kScaleTolerance or the packer's work reaches
         // workLimit. False when memory runs out.
-        bool Run(Packer& packer, double scale, int trials, uint64_t workLimit, double* bestScale) const
+        bool Run(Packer& packer, double scale, int trials, uint64_t workLimit, double* bestScale)
         {
             double low = 0, high = 0, turnsScale = 0;
             for (int trialNumber = 0; trialNumber < trials && packer.work < workLimit; ++trialNumber)
@@ -410,14 +518,10 @@ namespace
                 Trial trial;
                 bool searchTurns = turnsScale == 0 || scale > turnsScale * 1.05 || scale < turnsScale / 1.05;
                 turnsScale = searchTurns ? scale : turnsScale;
-                if (!packer.Pack(scale, searchTurns, trialPlaces, &trial))
+                if (!TryScale(packer, scale, searchTurns, &trial, bestScale))
                     return false;
                 if (Fits(trial))
-                {
                     low = scale;
-                    if (scale > *bestScale)
-                        Keep(scale, bestScale);
-                }
                 else
                 {
                     high = scale;
@@ -431,12 +535,30 @@ namespace
             return true;
         }
 
+        // From `from`, a scale at which the charts fit on a coarser atlas (which draws them
+        // fatter): steps of kClimbStep up while they fit, then halves the bracket until success
+        // and failure are within kScaleTolerance; at most `trials` packs, every chart in the
+        // orientation the packer holds. False when memory runs out.
+        bool Climb(Packer& packer, double from, int trials, double* bestScale)
+        {
+            double low = from, high = 0;
+            for (int trialNumber = 0; trialNumber < trials && !(high > 0 && high < low * kScaleTolerance); ++trialNumber)
+            {
+                double scale = high > 0 ? Sqrt(low * high) : low * kClimbStep;
+                Trial trial;
+                if (!TryScale(packer, scale, false, &trial, bestScale))
+                    return false;
+                *(Fits(trial) ? &low : &high) = scale;
+            }
+            return true;
+        }
+
         // Tries kRefineSteps scales in even steps above `from`, up to kRefineReach times it,
         // every orientation searched, while the work stays below workLimit; keeps the largest
         // that fits. Each scale is tried with the variants in turn (charts' order and the
         // skyline's choice) until one fits: more different layouts for the same work.
         bool Refine(Packer& packer, const ChartInfo* info, uint32_t* order, double from, uint64_t workLimit,
-                    double* bestScale) const
+                    double* bestScale)
         {
             const double kRefineReach = 1.12;
             const int kRefineSteps = 24;
@@ -449,22 +571,88 @@ namespace
                     continue;
                 for (int variant = 0; variant < 4 && packer.work < workLimit; ++variant)
                 {
-                    if (!OrderLargestFirst(info, chartCount, variant & 1 ? Order::ByExtent : Order::ByArea, order))
+                    if (!packer.SetVariant({variant & 1 ? Order::ByExtent : Order::ByArea, variant >= 2}, info, order))
                         return false;
-                    packer.SetMinimizeWaste(variant >= 2);
                     Trial trial;
-                    if (!packer.Pack(scale, true, trialPlaces, &trial))
+                    if (!TryScale(packer, scale, true, &trial, bestScale))
                         return false;
                     if (Fits(trial))
-                    {
-                        Keep(scale, bestScale);
                         break;
-                    }
                 }
             }
             return true;
         }
     };
+
+    // The charts and the working arrays that the searches of every atlas share.
+    struct Charts
+    {
+        const float* uv;
+        const uint32_t* start;
+        const uint32_t* members;
+        const ChartInfo* info;
+        uint32_t* order;   // the packing order, rewritten by each variant
+        uint8_t* turn;     // each chart's orientation when the turns are not searched
+        uint32_t count;
+        double largest;    // the largest chart extent
+        Outlines outlines;
+    };
+
+    // A search's result: the largest scale that fitted (0: none) and the variant it was packed with.
+    struct Outcome
+    {
+        double scale;
+        Variant variant;
+        uint64_t work;   // what the search cost (Packer::work)
+    };
+
+    // The search on one atlas; the places of the largest scale that fits go into `best`.
+    // Without a guide: steps 3 and 4 (every orientation, then the other choices within as much
+    // work again, less the work `spent` by other searches of the same charts, at most extraCap).
+    // With one (a coarser atlas's outcome and places): every chart keeps the
+    // guide's orientation and order, and only the scale is searched, from the guide's.
+    // False when memory runs out.
+    bool SearchAtlas(const Charts& charts, const Layout& layout, ChartPlace* trialPlaces, ChartPlace* best,
+                     const Outcome* guide, const ChartPlace* guidePlaces, uint64_t spent, uint64_t extraCap,
+                     Outcome* outcome)
+    {
+        Packer packer(charts.uv, charts.start, charts.members, charts.outlines, charts.info, charts.order, charts.turn,
+                      charts.count, layout);
+        ScaleSearch search = {trialPlaces, best, charts.count, charts.largest, layout};
+        double low = 0;
+        if (guide)
+        {
+            for (uint32_t c = 0; c < charts.count; ++c)
+                charts.turn[c] = (uint8_t)guidePlaces[c].orientation;
+            packer.SetStopAboveAtlas(true);
+            if (!packer.SetVariant(guide->variant, charts.info, charts.order) ||
+                !search.Climb(packer, guide->scale, kMaxTrials, &low))
+                return false;
+            *outcome = {low, search.bestVariant, packer.work};
+            return true;
+        }
+        double first = FirstScale(charts.info, charts.count, layout);
+        if (!packer.SetVariant({Order::ByArea, false}, charts.info, charts.order) ||
+            !search.Run(packer, first, kMaxTrials, ~0ull, &low))
+            return false;
+        // Then, within as much work again (at most 2 kExtraWork), the other order and scales above
+        // the best found: packing is not monotonic in the scale, least so with few charts.
+        // Many charts pack evenly at any scale: they skip it.
+        // No floor: a mesh that packed in a few milliseconds never waits for the second search.
+        // What other searches of this packing have spent comes out of it.
+        uint64_t extraWork =
+            charts.count > kExtraCharts ? 0 : (packer.work < 2 * kExtraWork ? packer.work : 2 * kExtraWork);
+        extraWork = extraWork > spent ? extraWork - spent : 0;
+        extraWork = extraWork < extraCap ? extraWork : extraCap;
+        uint64_t limit = packer.work + extraWork;
+        packer.SetStopAboveAtlas(true);
+        if (!packer.SetVariant({Order::ByExtent, false}, charts.info, charts.order) ||
+            !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
+            !search.Refine(packer, charts.info, charts.order, low, limit, &low))
+            return false;
+        *outcome = {low, search.bestVariant, packer.work};
+        return true;
+    }
 
     void MoveCorners(float* uv, const uint32_t* chartOf, uint32_t triCount, const ChartInfo* info, const ChartPlace* places,
                      double scale, const Layout& layout)
@@ -508,39 +696,77 @@ bool PackAtlas(float* uv, const uint32_t* chartOf, uint32_t triCount, uint32_t c
     if (chartCount == 0)
         return true;
 
-    Layout layout = ChooseLayout(margin, chartCount);
+    Layout fine = ChooseLayout(margin, FineTexels(chartCount));
 
     Scratch<uint32_t> start, members, order;
     Scratch<ChartInfo> info;
-    Scratch<ChartPlace> trialPlaces, bestPlaces;
+    Scratch<ChartPlace> trialPlaces, bestPlaces, finePlaces;
+    Scratch<uint8_t> turn;
     if (!GroupCharts(chartOf, triCount, chartCount, start, members) || !info.Allocate(chartCount) ||
         !order.Allocate(chartCount) || !trialPlaces.Allocate(chartCount) || !bestPlaces.Allocate(chartCount) ||
-        !MeasureCharts(uv, start.Data(), members.Data(), chartCount, info.Data()) ||
-        !OrderLargestFirst(info.Data(), chartCount, Order::ByArea, order.Data()))
+        !turn.Allocate(chartCount) || !MeasureCharts(uv, start.Data(), members.Data(), chartCount, info.Data()))
         return (*error = kOutOfMemory), false;
 
     double largest = 0;
     for (uint32_t c = 0; c < chartCount; ++c)
         largest = info[c].extent > largest ? info[c].extent : largest;
-    Scratch<uint8_t> turn;
-    if (!turn.Allocate(chartCount))
+    Scratch<float> outline;
+    Scratch<uint64_t> outlineStart;
+    if (!BuildOutlines(uv, start.Data(), members.Data(), chartCount, outline, outlineStart))
         return (*error = kOutOfMemory), false;
-    Packer packer(uv, start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, layout);
-    ScaleSearch search = {trialPlaces.Data(), bestPlaces.Data(), chartCount, largest, layout};
-    double first = FirstScale(info.Data(), chartCount, layout), low = 0;
-    if (!search.Run(packer, first, kMaxTrials, ~0ull, &low))
-        return (*error = kOutOfMemory), false;
-    // Then, within as much work again (at most 2 kExtraWork), the other order and scales above
-    // the best found: packing is not monotonic in the scale, least so with few charts.
-    // Many charts pack evenly at any scale: they skip it.
-    // No floor: a mesh that packed in a few milliseconds never waits for the second search.
-    uint64_t extraWork = chartCount > kExtraCharts ? 0 : (packer.work < 2 * kExtraWork ? packer.work : 2 * kExtraWork);
-    uint64_t limit = packer.work + extraWork;
-    packer.SetStopAboveAtlas(true);
-    if (!OrderLargestFirst(info.Data(), chartCount, Order::ByExtent, order.Data()) ||
-        !search.Run(packer, low > 0 ? low : first, kMaxTrials, (packer.work + limit) / 2, &low) ||
-        !search.Refine(packer, info.Data(), order.Data(), low, limit, &low))
-        return (*error = kOutOfMemory), false;
+    Charts charts = {uv,        start.Data(), members.Data(), info.Data(), order.Data(), turn.Data(), chartCount, largest,
+                     {outline.Data(), outlineStart.Data()}};
+    // Few large charts: the whole search also runs on a coarse atlas (a typical chart some 32
+    // texels across, so that a trial costs a small fraction of a fine one in texels; the
+    // triangles cost the same), and the fine atlas then climbs from its scale with the coarse
+    // winner's orientations and order. The coarse layout is valid in itself (its texels are
+    // wider than half the margin). The two searches often find different layouts (packing is
+    // far from monotonic), so the larger scale of both wins; on a small mesh (below kSmallMesh
+    // triangles) the full fine search, whose trials cost about the atlas's area whatever the
+    // input, is left out. Beyond kCoarseMaxCharts charts the coarse search is skipped: many
+    // charts pack evenly, and it would mostly add its cost.
+    uint32_t coarseTexels = chartCount > kCoarseMaxCharts && triCount >= kSmallMesh
+                                ? 0
+                                : CoarseTexels(info.Data(), chartCount, FirstScale(info.Data(), chartCount, fine), fine.atlasTexels);
+    // On a small mesh the coarse search's optional trials get work in proportion to the input.
+    uint64_t smallCap = triCount < kSmallMesh ? (uint64_t)kExtraWorkPerTriangle * triCount : ~0ull;
+    Outcome outcome = {0, {Order::ByArea, false}, 0};
+    Layout layout = fine;
+    uint64_t spent = 0;   // the work of the coarse search and the climb
+    if (coarseTexels)
+    {
+        Layout coarse = ChooseLayout(margin, coarseTexels);
+        Outcome coarseOutcome, climbed;
+        if (!SearchAtlas(charts, coarse, trialPlaces.Data(), bestPlaces.Data(), nullptr, nullptr, 0, smallCap, &coarseOutcome) ||
+            !finePlaces.Allocate(chartCount))
+            return (*error = kOutOfMemory), false;
+        outcome = coarseOutcome, layout = coarse, spent = coarseOutcome.work;
+        if (coarseOutcome.scale > 0)
+        {
+            if (!SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), &coarseOutcome, bestPlaces.Data(), 0, 0,
+                             &climbed))
+                return (*error = kOutOfMemory), false;
+            spent += climbed.work;
+            if (climbed.scale > outcome.scale)
+            {
+                outcome = climbed, layout = fine;
+                memcpy(bestPlaces.Data(), finePlaces.Data(), (uint64_t)chartCount * sizeof(ChartPlace));
+            }
+        }
+    }
+    if (!coarseTexels || triCount >= kSmallMesh || outcome.scale == 0)
+    {
+        Outcome full;
+        if (!finePlaces.Allocate(chartCount) ||
+            !SearchAtlas(charts, fine, trialPlaces.Data(), finePlaces.Data(), nullptr, nullptr, spent, ~0ull, &full))
+            return (*error = kOutOfMemory), false;
+        if (full.scale > outcome.scale)
+        {
+            outcome = full, layout = fine;
+            memcpy(bestPlaces.Data(), finePlaces.Data(), (uint64_t)chartCount * sizeof(ChartPlace));
+        }
+    }
+    double low = outcome.scale;
     if (low == 0)
         return (*error = kDoesNotFit), false;
     MoveCorners(uv, chartOf, triCount, info.Data(), bestPlaces.Data(), low, layout);

@@ -11,18 +11,22 @@
 //   overestimate), then the best group's g positions either side are worked out exactly.
 // - Holes: the bitmap below the skyline's best top is searched bottom-left, within a budget.
 //   Each atlas row keeps its longest free run, so rows that cannot hold the chart's runs are
-//   skipped unread; for runs up to 64 texels the lowest row that has one
-//   is remembered (rows only ever fill up); candidate offsets come from the free runs of the
-//   chart's widest row; a fit is tested 64 texels at a time.
+//   skipped unread (the rows with the longest runs are checked first, and an atlas row too
+//   full for any chart row is stepped over at once); for runs up to 64 texels the lowest row
+//   that has one is remembered (rows only ever fill up); candidate offsets come from the free
+//   runs of the chart's widest row; a fit is tested 64 texels at a time, and a collision moves
+//   the offset past every position that must collide the same way.
 #pragma once
 
 #include "PackRaster.h"
 
 const uint32_t kNoTopLimit = 0xFFFFFFFFu;
-// Rows plus positions the hole searches of one trial examine at most, shared out among the
-// charts (all orientations of a chart together), within the per-chart bounds: holes are a
-// refinement, and a crowded atlas could otherwise cost a test at every free texel per chart.
-const int64_t kHoleSearchTrialBudget = 1 << 22;
+// The work the hole searches of one trial do at most, shared out among the charts (all
+// orientations of a chart together), within the per-chart bounds: a unit for every offset
+// row and every position tested, and one for every 16 rows of free-run checks or words of
+// the anchor row read. Holes are a refinement, and a crowded atlas could otherwise cost a
+// test at every free texel per chart.
+const int64_t kHoleSearchTrialBudget = 1 << 21;
 const int64_t kHoleSearchChartBudget[2] = {1024, 16384};
 
 struct AtlasOccupancy

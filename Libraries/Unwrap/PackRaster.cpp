@@ -60,6 +60,24 @@ namespace
         double x, y;
     };
 
+    // Room for `rows` + 1 row starts and `count` crossings.
+    bool ReserveCrossings(ChartRaster* raster, uint64_t rows, uint64_t count)
+    {
+        if (rows > raster->crossingRowCapacity)
+        {
+            if (!raster->crossingStart.Allocate(rows + rows / 2))
+                return (raster->crossingRowCapacity = 0), (raster->outOfMemory = true), false;
+            raster->crossingRowCapacity = rows + rows / 2;
+        }
+        if (count > raster->crossingCapacity)
+        {
+            if (!raster->crossings.Allocate(count + count / 2))
+                return (raster->crossingCapacity = 0), (raster->outOfMemory = true), false;
+            raster->crossingCapacity = count + count / 2;
+        }
+        return true;
+    }
+
     // A triangle sorted by v, with the slopes du/dv of its long edge (bottom to top) and of
     // its two short edges, for the u extent of its part within a band of v.
     struct SortedTriangle
@@ -212,6 +230,132 @@ namespace
             reach += step;
         }
     }
+    // The chart's triangles, each texel they touch, dilated by `pad`.
+    void DrawTriangles(const float* uv, const uint32_t* triangles, uint32_t count, double c, double s, double h, uint32_t pad,
+                       ChartRaster* raster)
+    {
+        // Dilating the bitmap afterwards costs a few passes over it; drawing each triangle already
+        // dilated (its band of rows widened by `pad` either way, its span by `pad` texels) costs
+        // 2 pad more rows a triangle. Both set the same texels; the cheaper one is taken.
+        uint32_t dilateSteps = 0;
+        for (uint32_t reach = 0; reach < pad; reach += reach + 1)
+            ++dilateSteps;
+        const int64_t grow = (uint64_t)count * 2 * pad <= 3ull * raster->words * raster->height * dilateSteps ? pad : 0;
+        const int64_t lastColumn = raster->width - 1, lastRow = raster->height - 1;
+        auto clampColumn = [lastColumn](int64_t x) { return x < 0 ? 0 : (x > lastColumn ? lastColumn : x); };
+        auto clampRow = [lastRow](int64_t y) { return y < 0 ? 0 : (y > lastRow ? lastRow : y); };
+        for (uint32_t i = 0; i < count; ++i)
+        {
+            const float* t = uv + 6ull * triangles[i];
+            Corner p[3];
+            for (int k = 0; k < 3; ++k)
+                p[k] = {(c * t[2 * k] - s * t[2 * k + 1] - raster->originX) / h, (s * t[2 * k] + c * t[2 * k + 1] - raster->originY) / h};
+            // In texel units from here on: texel (x, y) is [x, x + 1] x [y, y + 1].
+            int64_t low = Floor(Min3(p[0].y, p[1].y, p[2].y)), high = Floor(Max3(p[0].y, p[1].y, p[2].y));
+            int64_t left = Floor(Min3(p[0].x, p[1].x, p[2].x)), right = Floor(Max3(p[0].x, p[1].x, p[2].x));
+            int64_t row0 = clampRow(low - grow), row1 = clampRow(high + grow);
+            if (high - low <= 1 && right - left <= 1)
+            {
+                for (int64_t row = row0; row <= row1; ++row)
+                    SetBits(raster->Row((uint32_t)row), (uint32_t)clampColumn(left - grow), (uint32_t)clampColumn(right + grow));
+                continue;
+            }
+            SortedTriangle sorted(p);
+            for (int64_t row = row0; row <= row1; ++row)
+            {
+                double xMin, xMax;
+                sorted.Extent((double)(row - grow), (double)(row + 1 + grow), &xMin, &xMax);
+                SetBits(raster->Row((uint32_t)row), (uint32_t)clampColumn(Floor(xMin) - grow), (uint32_t)clampColumn(Floor(xMax) + grow));
+            }
+        }
+        if (grow == 0)
+            Dilate(raster, pad);
+    }
+
+    // The row's texels [first, last] (texel units, clamped to the bitmap), set.
+    struct RowWriter
+    {
+        ChartRaster* raster;
+        int64_t lastColumn;
+        void Set(int64_t row, int64_t first, int64_t last) const
+        {
+            first = first < 0 ? 0 : first, last = last > lastColumn ? lastColumn : last;
+            if (row >= 0 && row < (int64_t)raster->height && first <= last)
+                SetBits(raster->Row((uint32_t)row), (uint32_t)first, (uint32_t)last);
+        }
+    };
+
+    // The outline's texels: every texel a boundary edge touches, dilated by `pad`, and every
+    // texel whose centre lies inside (even-odd along the row's centre line; an endpoint counts
+    // for the edge it is the lower end of). The inside needs no dilation: a texel within `pad`
+    // of an inside texel but outside itself has the boundary between their centres, in a
+    // boundary texel within `pad` of it. False when a row meets an odd number of crossings.
+    bool DrawOutline(const float* outline, uint32_t segments, double c, double s, double h, uint32_t pad, ChartRaster* r)
+    {
+        const int64_t grow = pad;
+        RowWriter row = {r, (int64_t)r->width - 1};
+        if (!ReserveCrossings(r, r->height + 1ull, 0))
+            return false;
+        uint32_t* start = r->crossingStart.Data();
+        memset(start, 0, (r->height + 1ull) * 4);
+        auto corner = [&](const float* p) {
+            return Corner{(c * p[0] - s * p[1] - r->originX) / h, (s * p[0] + c * p[1] - r->originY) / h};
+        };
+        // The rows whose centre line an edge crosses: low.y <= row + 0.5 < high.y.
+        auto crossedRows = [](const Corner& a, const Corner& b, int64_t* first, int64_t* last) {
+            double low = a.y < b.y ? a.y : b.y, high = a.y < b.y ? b.y : a.y;
+            *first = -Floor(0.5 - low), *last = -Floor(0.5 - high) - 1;
+        };
+        for (uint32_t i = 0; i < segments; ++i)
+        {
+            Corner a = corner(outline + 4ull * i), b = corner(outline + 4ull * i + 2);
+            double low = a.y < b.y ? a.y : b.y, high = a.y < b.y ? b.y : a.y;
+            double slope = high > low ? (b.x - a.x) / (b.y - a.y) : 0;
+            for (int64_t y = Floor(low) - grow; y <= Floor(high) + grow; ++y)
+            {
+                double bandLow = (double)(y - grow) > low ? (double)(y - grow) : low;
+                double bandHigh = (double)(y + 1 + grow) < high ? (double)(y + 1 + grow) : high;
+                double x0 = high > low ? a.x + (bandLow - a.y) * slope : a.x, x1 = high > low ? a.x + (bandHigh - a.y) * slope : b.x;
+                double xMin = x0 < x1 ? x0 : x1, xMax = x0 < x1 ? x1 : x0;
+                row.Set(y, Floor(xMin) - grow, Floor(xMax) + grow);
+            }
+            int64_t first, last;
+            crossedRows(a, b, &first, &last);
+            for (int64_t y = first; y <= last; ++y)
+                if (y >= 0 && y < (int64_t)r->height)
+                    ++start[y + 1];
+        }
+        for (uint32_t y = 0; y < r->height; ++y)
+            start[y + 1] += start[y];
+        if (!ReserveCrossings(r, r->height + 1ull, start[r->height]))
+            return false;
+        start = r->crossingStart.Data();
+        double* crossings = r->crossings.Data();
+        for (uint32_t i = 0; i < segments; ++i)   // start[y] ends up at row y + 1's first crossing
+        {
+            Corner a = corner(outline + 4ull * i), b = corner(outline + 4ull * i + 2);
+            int64_t first, last;
+            crossedRows(a, b, &first, &last);
+            for (int64_t y = first; y <= last; ++y)
+                if (y >= 0 && y < (int64_t)r->height)
+                    crossings[start[y]++] = a.x + (y + 0.5 - a.y) * (b.x - a.x) / (b.y - a.y);
+        }
+        for (uint32_t y = 0, from = 0; y < r->height; from = start[y++])
+        {
+            uint32_t to = start[y];
+            if ((to - from) & 1)
+                return false;
+            for (uint32_t i = from + 1; i < to; ++i)   // insertion sort: a few crossings a row
+                for (uint32_t j = i; j > from && crossings[j] < crossings[j - 1]; --j)
+                {
+                    double t = crossings[j];
+                    crossings[j] = crossings[j - 1], crossings[j - 1] = t;
+                }
+            for (uint32_t i = from; i < to; i += 2)   // centres x + 0.5 in [crossings[i], crossings[i + 1]]
+                row.Set(y, -Floor(0.5 - crossings[i]), Floor(crossings[i + 1] - 0.5));
+        }
+        return true;
+    }
 }
 
 uint32_t LongestSetRun(const uint64_t* row, uint32_t words, uint32_t* first, uint32_t* last)
@@ -250,20 +394,24 @@ uint32_t LongestSetRun(const uint64_t* row, uint32_t words, uint32_t* first, uin
     return best;
 }
 
-bool RasterizeChart(const float* uv, const uint32_t* triangles, uint32_t count, const RasterPose& pose, uint32_t maxTexels,
-                    ChartRaster* raster)
+bool RasterizeChart(const float* uv, const uint32_t* triangles, uint32_t count, const float* outline, uint32_t segments,
+                    const RasterPose& pose, uint32_t maxTexels, ChartRaster* raster)
 {
     raster->width = raster->height = 0;
     raster->outOfMemory = false;
     const double c = pose.cosine * pose.scale, s = pose.sine * pose.scale, h = pose.texel;
     double minX = 1e300, minY = 1e300, maxX = -1e300, maxY = -1e300;
-    for (uint32_t i = 0; i < count; ++i)
+    auto extend = [&](const float* p) {
+        double x = c * p[0] - s * p[1], y = s * p[0] + c * p[1];
+        minX = x < minX ? x : minX, maxX = x > maxX ? x : maxX;
+        minY = y < minY ? y : minY, maxY = y > maxY ? y : maxY;
+    };
+    // The outline holds every extreme point of the chart.
+    for (uint32_t i = 0; i < segments; ++i)
+        extend(outline + 4ull * i), extend(outline + 4ull * i + 2);
+    for (uint32_t i = 0; i < count && segments == 0; ++i)
         for (uint32_t k = 6 * triangles[i]; k < 6 * triangles[i] + 6; k += 2)
-        {
-            double x = c * uv[k] - s * uv[k + 1], y = s * uv[k] + c * uv[k + 1];
-            minX = x < minX ? x : minX, maxX = x > maxX ? x : maxX;
-            minY = y < minY ? y : minY, maxY = y > maxY ? y : maxY;
-        }
+            extend(uv + k);
     // The chart's own texels start `dilationTexels` in from the bitmap's lower-left corner.
     const uint32_t pad = pose.dilationTexels;
     raster->originX = minX - pad * h, raster->originY = minY - pad * h;
@@ -275,34 +423,15 @@ bool RasterizeChart(const float* uv, const uint32_t* triangles, uint32_t count, 
     if (!Reserve(raster, (uint64_t)raster->words * raster->height, raster->height, 64ull * raster->words))
         return (raster->outOfMemory = true), (raster->width = 0), false;
     memset(raster->bits.Data(), 0, (uint64_t)raster->words * raster->height * 8);
-
-    const int64_t lastColumn = raster->width - 1, lastRow = raster->height - 1;
-    auto clampColumn = [lastColumn](int64_t x) { return x < 0 ? 0 : (x > lastColumn ? lastColumn : x); };
-    auto clampRow = [lastRow](int64_t y) { return y < 0 ? 0 : (y > lastRow ? lastRow : y); };
-    for (uint32_t i = 0; i < count; ++i)
+    bool drawn = segments > 0 && DrawOutline(outline, segments, c, s, h, pad, raster);
+    if (raster->outOfMemory)
+        return (raster->width = 0), false;
+    if (!drawn)
     {
-        const float* t = uv + 6ull * triangles[i];
-        Corner p[3];
-        for (int k = 0; k < 3; ++k)
-            p[k] = {(c * t[2 * k] - s * t[2 * k + 1] - raster->originX) / h, (s * t[2 * k] + c * t[2 * k + 1] - raster->originY) / h};
-        // In texel units from here on: texel (x, y) is [x, x + 1] x [y, y + 1].
-        int64_t row0 = clampRow(Floor(Min3(p[0].y, p[1].y, p[2].y))), row1 = clampRow(Floor(Max3(p[0].y, p[1].y, p[2].y)));
-        int64_t col0 = clampColumn(Floor(Min3(p[0].x, p[1].x, p[2].x))), col1 = clampColumn(Floor(Max3(p[0].x, p[1].x, p[2].x)));
-        if (row1 - row0 <= 1 && col1 - col0 <= 1)
-        {
-            for (int64_t row = row0; row <= row1; ++row)
-                SetBits(raster->Row((uint32_t)row), (uint32_t)col0, (uint32_t)col1);
-            continue;
-        }
-        SortedTriangle sorted(p);
-        for (int64_t row = row0; row <= row1; ++row)
-        {
-            double xMin, xMax;
-            sorted.Extent((double)row, (double)(row + 1), &xMin, &xMax);
-            SetBits(raster->Row((uint32_t)row), (uint32_t)clampColumn(Floor(xMin)), (uint32_t)clampColumn(Floor(xMax)));
-        }
+        if (segments > 0)   // an outline that does not close: the triangles decide
+            memset(raster->bits.Data(), 0, (uint64_t)raster->words * raster->height * 8);
+        DrawTriangles(uv, triangles, count, c, s, h, pad, raster);
     }
-    Dilate(raster, pad);
     Summarize(raster);
     ColumnEnds(raster, true, raster->columnLow.Data(), raster->spare.Data());
     ColumnEnds(raster, false, raster->columnHigh.Data(), raster->spare.Data());

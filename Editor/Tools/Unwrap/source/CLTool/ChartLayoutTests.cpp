@@ -635,6 +635,86 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
         CHECK_EQUAL(0u, flipped);
     }
 
+    TEST_FIXTURE(ChartsFixture, FewLargeCharts_PackAtTheFineAtlasDensityWithAnyMargin)
+    {
+        // The six sides of a cube: few large charts are first packed on a coarse bitmap, whose
+        // fat outlines alone cover about 0.58 of the square; the fine bitmap must then take the
+        // layout further (0.64 at the default margin), and a wide margin must hold on both.
+        Mesh cube;
+        for (int i = 0; i < 8; ++i)
+            cube.Add(float(i & 1), float((i >> 1) & 1), float(i >> 2));
+        const uint32_t quads[6][4] = {{0, 2, 3, 1}, {4, 5, 7, 6}, {0, 1, 5, 4}, {1, 3, 7, 5}, {3, 2, 6, 7}, {2, 0, 4, 6}};
+        for (const uint32_t* q : quads)
+            cube.Face(q[0], q[1], q[2]), cube.Face(q[0], q[2], q[3]);
+        for (float margin : {1.0f / 256, 0.05f})
+        {
+            Params params;
+            params.packMargin = margin;
+            Layout layout = Unwrap(cube, params);
+            CHECK_EQUAL(12u * 6, layout.uv.size());
+            CHECK_EQUAL(6u, ChartCount(Charts(layout)));
+            CHECK_EQUAL("", BrokenPromise(layout, margin, true));
+            double covered = 0;
+            for (uint32_t t = 0; t < layout.mesh.TriCount(); ++t)
+                covered += layout.UVArea(t);
+            if (margin < 0.01f)
+                CHECK(covered > 0.62);
+        }
+    }
+
+    TEST_FIXTURE(ChartsFixture, Holes_SmallChartsFillTheHoleOfAFrame)
+    {
+        // A flat square frame (16 x 16 quads of side 0.25 without the middle 8 x 8: a chart of
+        // many triangles, drawn from its outline, inner edges included) and twelve loose squares
+        // of side 0.4 in other planes. The frame spans the square's side; the squares fit only
+        // into its hole, which the skyline cannot reach: the hole search must find it, and the
+        // frame's drawing must leave it empty.
+        Mesh mesh;
+        const int n = 16;
+        uint32_t grid[n + 1][n + 1];
+        for (int i = 0; i <= n; ++i)
+            for (int j = 0; j <= n; ++j)
+                grid[i][j] = mesh.Add(0.25f * i, 0.25f * j, 0);
+        auto inHole = [](int i, int j) { return i >= n / 4 && i < 3 * n / 4 && j >= n / 4 && j < 3 * n / 4; };
+        for (int i = 0; i < n; ++i)
+            for (int j = 0; j < n; ++j)
+                if (!inHole(i, j))
+                    mesh.Face(grid[i][j], grid[i + 1][j], grid[i + 1][j + 1]), mesh.Face(grid[i][j], grid[i + 1][j + 1], grid[i][j + 1]);
+        const uint32_t frameTriangles = mesh.TriCount();
+        for (int k = 0; k < 12; ++k)
+        {
+            float z = 5.0f + k;
+            uint32_t a = mesh.Add(0, 0, z), b = mesh.Add(0.4f, 0, z), c = mesh.Add(0.4f, 0.4f, z), d = mesh.Add(0, 0.4f, z);
+            mesh.Face(a, b, c), mesh.Face(a, c, d);
+        }
+        Layout layout = Unwrap(mesh);
+        CHECK_EQUAL(size_t(6) * mesh.TriCount(), layout.uv.size());
+        if (layout.uv.empty())
+            return;
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, true));
+        // The hole's corners in UV: the frame's inner grid points at 1 and 3.
+        double low[2] = {1, 1}, high[2] = {0, 0};
+        for (uint32_t t = 0; t < frameTriangles; ++t)
+            for (int c = 0; c < 3; ++c)
+            {
+                const float* p = &mesh.positions[3 * mesh.tri[3 * t + c]];
+                if ((p[0] == 1 || p[0] == 3) && (p[1] == 1 || p[1] == 3))
+                    for (int k = 0; k < 2; ++k)
+                        low[k] = std::min(low[k], double(layout.uv[6 * t + 2 * c + k])),
+                        high[k] = std::max(high[k], double(layout.uv[6 * t + 2 * c + k]));
+            }
+        uint32_t inside = 0;
+        for (uint32_t t = frameTriangles; t < mesh.TriCount(); ++t)
+        {
+            bool in = true;
+            for (int c = 0; c < 3; ++c)
+                for (int k = 0; k < 2; ++k)
+                    in = in && layout.uv[6 * t + 2 * c + k] > low[k] && layout.uv[6 * t + 2 * c + k] < high[k];
+            inside += in;
+        }
+        CHECK_EQUAL(mesh.TriCount() - frameTriangles, inside);
+    }
+
     TEST_FIXTURE(ChartsFixture, ManyCharts_PackedApartAtOneScale)
     {
         // 150 loose triangles of varied size and shape, in varied planes.
