@@ -146,16 +146,15 @@ bool ConformalMapper::Solve(const uint32_t* triangles, uint32_t count, FlatChart
     HermitianMatrix h;
     if (!BuildConformalMatrix(*m_Mesh, triangles, count, out->corner.Data(), out->vertexCount, &h))
         return false;
-    // Stop at a residual 1e-5 of the projection's, within 50 + 4 sqrt(n) steps: further digits
-    // change the map's distortion by less than 1e-3 and cost as much again (measured on tori and
-    // scans). Or stop where what is left is far below what float UVs resolve: residual components
-    // within 2^-36 of the chart's size times their row's weight. A nearly planar chart's projection
-    // is already there: its steps would only chase rounding noise.
-    double floor = 0, resolution = out->uv[2 * pin1] * kResidualResolution;
-    for (uint32_t i = 0; i < h.n; ++i)
-        floor += 2 * (resolution * h.diag[i]) * (resolution * h.diag[i]);
-    double limit = 50 + 4 * Sqrt((double)h.n);
-    SolveControl control = {1e-10, floor, limit > 4000 ? 4000 : (uint32_t)limit};
+    // Stop at a residual 1e-5 of the projection's (M^-1 norm), or where what is left is far below
+    // what float UVs resolve (2^-36 of the chart's size: a nearly planar chart's projection is
+    // already there and takes no step), or after 50 + 6 sqrt(n) steps. That cap binds on charts of
+    // more than a few thousand vertices: the conformal system has many near-null modes (maps that
+    // are conformal but for the discretisation), along which the steps creep. Going on to the
+    // tolerance lowers such charts' area distortion further (a 100k-triangle torus: 0.038 at the
+    // cap, 0.031 converged) at about 13 % more steps.
+    double limit = 50 + 6 * Sqrt((double)h.n);
+    SolveControl control = {1e-10, out->uv[2 * pin1] * kResidualResolution, limit > 4000 ? 4000 : (uint32_t)limit};
     uint32_t steps = SolvePinned(h, out->uv.Data(), pin0, pin1, control);
     if (steps == kSolveOutOfMemory)
         return false;

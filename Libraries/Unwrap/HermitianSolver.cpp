@@ -5,127 +5,102 @@
 
 namespace
 {
-    // Incomplete Cholesky factor (no fill) of H seen as the complex Hermitian matrix L + iB acting
-    // on z = u + iv: H ~ F F^H with F lower triangular on the pattern of H. Rows and columns of the
-    // pins are left out (identity). A pivot that would not be positive falls back to the diagonal
-    // of H (obtuse triangles make H no M-matrix, so this can happen).
-    struct Preconditioner
+    // The preconditioner M = (D + L) D^-1 (D + L^H), L the strict lower part of H (pins' rows and
+    // columns left out), D real and diagonal. Both triangular factors are H's own rows (sorted by
+    // column: the lower entries come first), so only D is stored.
+    struct SplitSystem
     {
-        const HermitianMatrix* h = nullptr;
-        Scratch<double> re, im, pivot;   // re/im aligned with h->entries (lower part used)
-        uint32_t pin0 = 0, pin1 = 0;
-        // The factor's strictly lower part packed row by row for the solves: (re, im) pairs.
-        Scratch<uint32_t> lowerStart, lowerColumn;
-        Scratch<double> lower, inversePivot;
-
-        bool Pack()
-        {
-            uint32_t n = h->n, count = 0;
-            for (uint32_t i = 0; i < n; ++i)
-                for (uint32_t a = h->rowStart[i]; a < h->rowStart[i + 1] && h->entries[a].column < i; ++a)
-                    ++count;
-            if (!lowerStart.Allocate(n + 1ull) || !lowerColumn.Allocate(count + 1ull) || !lower.Allocate(2ull * count + 2) ||
-                !inversePivot.Allocate(n + 1ull))
-                return false;
-            uint32_t k = 0;
-            for (uint32_t i = 0; i < n; ++i)
-            {
-                lowerStart[i] = k;
-                inversePivot[i] = 1 / pivot[i];
-                for (uint32_t a = h->rowStart[i]; a < h->rowStart[i + 1] && h->entries[a].column < i; ++a, ++k)
-                {
-                    lowerColumn[k] = h->entries[a].column;
-                    lower[2ull * k] = re[a];
-                    lower[2ull * k + 1] = im[a];
-                }
-            }
-            lowerStart[n] = k;
-            re.Release();   // the solves read only the packed factor
-            im.Release();
-            pivot.Release();
-            return true;
-        }
+        const HermitianMatrix& h;
+        uint32_t pin0, pin1;
+        Scratch<double> d, root;   // D and D^1/2
 
         bool Pinned(uint32_t i) const { return i == pin0 || i == pin1; }
 
-        bool Factor(const HermitianMatrix& matrix, uint32_t p0, uint32_t p1)
+        // D keeps M's diagonal equal to H's (diagonal ILU): d_i = h_ii - sum_k<i |h_ik|^2 / d_k.
+        // A pivot that would not stay clearly positive (obtuse triangles make H no M-matrix) falls
+        // back to h_ii, which keeps M positive definite.
+        bool Factor()
         {
-            h = &matrix;
-            pin0 = p0;
-            pin1 = p1;
-            uint32_t n = matrix.n;
-            if (!re.Allocate(matrix.rowStart[n] + 1ull) || !im.Allocate(matrix.rowStart[n] + 1ull) || !pivot.Allocate(n))
+            uint32_t n = h.n;
+            if (!d.Allocate(n + 1ull) || !root.Allocate(n + 1ull))
                 return false;
             for (uint32_t i = 0; i < n; ++i)
             {
-                uint32_t begin = matrix.rowStart[i], end = matrix.rowStart[i + 1];
                 double sum = 0;
-                for (uint32_t a = begin; a < end && matrix.entries[a].column < i; ++a)
+                for (uint32_t a = h.rowStart[i]; a < h.rowStart[i + 1] && h.entries[a].column < i; ++a)
                 {
-                    uint32_t k = matrix.entries[a].column;
-                    re[a] = im[a] = 0;
-                    if (Pinned(i) || Pinned(k))
-                        continue;
-                    double sr = matrix.entries[a].laplace, si = matrix.entries[a].area;
-                    // minus sum over j < k of F_ij conj(F_kj): merge the two rows' lower parts
-                    uint32_t x = begin, y = matrix.rowStart[k];
-                    while (x < a && y < matrix.rowStart[k + 1] && matrix.entries[y].column < k)
-                    {
-                        uint32_t cx = matrix.entries[x].column, cy = matrix.entries[y].column;
-                        if (cx < cy)
-                            ++x;
-                        else if (cy < cx)
-                            ++y;
-                        else
-                        {
-                            sr -= re[x] * re[y] + im[x] * im[y];
-                            si -= im[x] * re[y] - re[x] * im[y];
-                            ++x;
-                            ++y;
-                        }
-                    }
-                    re[a] = sr / pivot[k];
-                    im[a] = si / pivot[k];
-                    sum += re[a] * re[a] + im[a] * im[a];
+                    const MatrixEntry& e = h.entries[a];
+                    if (!Pinned(e.column))
+                        sum += (e.laplace * e.laplace + e.area * e.area) / d[e.column];
                 }
-                double d = matrix.diag[i] - sum;
-                pivot[i] = Pinned(i) ? 1 : Sqrt(d > 1e-8 * matrix.diag[i] ? d : (matrix.diag[i] > 0 ? matrix.diag[i] : 1));
+                double pivot = h.diag[i] - sum;
+                d[i] = Pinned(i) ? 1 : (pivot > 1e-3 * h.diag[i] ? pivot : (h.diag[i] > 0 ? h.diag[i] : 1));
+                root[i] = Sqrt(d[i]);
             }
-            return Pack();
+            return true;
         }
 
-        // z = (F F^H)^-1 r, both interleaved (u, v); z may not alias r.
-        void Apply(const double* r, double* z) const
+        // w = (D + L)^-1 s, rows in ascending order; zero at the pins.
+        void Forward(const double* s, double* w) const
         {
-            uint32_t n = h->n;
-            for (uint32_t i = 0; i < n; ++i)   // F y = r
+            for (uint32_t i = 0; i < h.n; ++i)
             {
-                double yr = r[2 * i], yi = r[2 * i + 1];
-                for (uint32_t a = lowerStart[i]; a < lowerStart[i + 1]; ++a)
+                double u = s[2 * i], v = s[2 * i + 1];
+                for (uint32_t a = h.rowStart[i]; a < h.rowStart[i + 1] && h.entries[a].column < i; ++a)
                 {
-                    uint32_t k = lowerColumn[a];
-                    double fr = lower[2ull * a], fi = lower[2ull * a + 1];
-                    yr -= fr * z[2 * k] - fi * z[2 * k + 1];
-                    yi -= fr * z[2 * k + 1] + fi * z[2 * k];
+                    const MatrixEntry& e = h.entries[a];
+                    double wu = w[2 * e.column], wv = w[2 * e.column + 1];   // zero at the pins
+                    u -= e.laplace * wu - e.area * wv;
+                    v -= e.area * wu + e.laplace * wv;
                 }
-                z[2 * i] = yr * inversePivot[i];
-                z[2 * i + 1] = yi * inversePivot[i];
+                w[2 * i] = Pinned(i) ? 0 : u / d[i];
+                w[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
             }
-            for (uint32_t i = n; i-- > 0;)   // F^H z = y, column by column
+        }
+
+        // t = (D + L^H)^-1 s, rows in descending order over their upper entries (H is Hermitian:
+        // row i of L^H is the upper part of H's row i); zero at the pins.
+        void Backward(const double* s, double* t) const
+        {
+            for (uint32_t i = h.n; i-- > 0;)
             {
-                double zr = z[2 * i] * inversePivot[i], zi = z[2 * i + 1] * inversePivot[i];
-                z[2 * i] = zr;
-                z[2 * i + 1] = zi;
-                for (uint32_t a = lowerStart[i]; a < lowerStart[i + 1]; ++a)
+                double u = s[2 * i], v = s[2 * i + 1];
+                for (uint32_t a = h.rowStart[i + 1]; a-- > h.rowStart[i] && h.entries[a].column > i;)
                 {
-                    uint32_t k = lowerColumn[a];
-                    double fr = lower[2ull * a], fi = lower[2ull * a + 1];
-                    z[2 * k] -= fr * zr + fi * zi;
-                    z[2 * k + 1] -= fr * zi - fi * zr;
+                    const MatrixEntry& e = h.entries[a];
+                    double tu = t[2 * e.column], tv = t[2 * e.column + 1];
+                    u -= e.laplace * tu - e.area * tv;
+                    v -= e.area * tu + e.laplace * tv;
                 }
+                t[2 * i] = Pinned(i) ? 0 : u / d[i];
+                t[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
             }
-            if (n)
-                z[2 * pin0] = z[2 * pin0 + 1] = z[2 * pin1] = z[2 * pin1 + 1] = 0;
+        }
+
+        // q = S p with S = D^1/2 (D + L)^-1 H (D + L^H)^-1 D^1/2, the preconditioned matrix, without
+        // a product with H (Eisenstat): with t = (D + L^H)^-1 D^1/2 p and H = (D + L) + (D + L^H) -
+        // (2 D - diag H), S p = D^1/2 (t + (D + L)^-1 (D^1/2 p - (2 D - diag H) t)). w: scratch.
+        void Apply(const double* p, double* q, double* t, double* w) const
+        {
+            uint32_t n = h.n;
+            for (uint32_t i = 0; i < n; ++i)
+            {
+                w[2 * i] = root[i] * p[2 * i];
+                w[2 * i + 1] = root[i] * p[2 * i + 1];
+            }
+            Backward(w, t);
+            for (uint32_t i = 0; i < n; ++i)
+            {
+                double k = 2 * d[i] - h.diag[i];
+                w[2 * i] -= k * t[2 * i];
+                w[2 * i + 1] -= k * t[2 * i + 1];
+            }
+            Forward(w, q);
+            for (uint32_t i = 0; i < n; ++i)
+            {
+                q[2 * i] = Pinned(i) ? 0 : root[i] * (t[2 * i] + q[2 * i]);
+                q[2 * i + 1] = Pinned(i) ? 0 : root[i] * (t[2 * i + 1] + q[2 * i + 1]);
+            }
         }
     };
 
@@ -136,73 +111,68 @@ namespace
             sum += a[i] * b[i];
         return sum;
     }
-
-    void ClearPins(double* a, uint32_t pin0, uint32_t pin1) { a[2 * pin0] = a[2 * pin0 + 1] = a[2 * pin1] = a[2 * pin1 + 1] = 0; }
-
-    // r = -H x, zero at the pins.
-    void Residual(const HermitianMatrix& h, const double* x, double* r, uint32_t pin0, uint32_t pin1)
-    {
-        h.Multiply(x, r);
-        for (uint64_t i = 0; i < 2ull * h.n; ++i)
-            r[i] = -r[i];
-        ClearPins(r, pin0, pin1);
-    }
-
-    // Preconditioned conjugate gradients from x, whose residual r already holds; `stop` is the
-    // squared residual norm to reach. Returns the steps taken, or kSolveOutOfMemory.
-    uint32_t ConjugateGradients(const HermitianMatrix& h, double* x, double* r, uint32_t pin0, uint32_t pin1, double stop,
-                                uint32_t maxIterations)
-    {
-        uint64_t m = 2ull * h.n;
-        Scratch<double> z, p, q;
-        Preconditioner incomplete;
-        if (!z.Allocate(m) || !p.Allocate(m) || !q.Allocate(m) || !incomplete.Factor(h, pin0, pin1))
-            return kSolveOutOfMemory;
-        if (DotN(r, r, m) <= stop)
-            return 0;
-        incomplete.Apply(r, z.Data());
-        memcpy(p.Data(), z.Data(), m * sizeof(double));
-        double rz = DotN(r, z.Data(), m);
-        uint32_t it = 0;
-        while (it < maxIterations && rz > 0)
-        {
-            ++it;
-            h.Multiply(p.Data(), q.Data());
-            ClearPins(q.Data(), pin0, pin1);
-            double pq = DotN(p.Data(), q.Data(), m);
-            if (!(pq > 0))
-                break;
-            double alpha = rz / pq, rr = 0;   // one pass: the same sums in the same order
-            for (uint64_t i = 0; i < m; ++i)
-            {
-                x[i] += alpha * p[i];
-                r[i] -= alpha * q[i];
-                rr += r[i] * r[i];
-            }
-            if (rr <= stop)
-                break;
-            incomplete.Apply(r, z.Data());
-            double next = DotN(r, z.Data(), m);
-            double beta = next / rz;
-            rz = next;
-            for (uint64_t i = 0; i < m; ++i)
-                p[i] = z[i] + beta * p[i];
-        }
-        return it;
-    }
 }
 
-uint32_t SolvePinned(const HermitianMatrix& h, double* x, uint32_t pin0, uint32_t pin1,
-                     const SolveControl& control)
+uint32_t SolvePinned(const HermitianMatrix& h, double* x, uint32_t pin0, uint32_t pin1, const SolveControl& control)
 {
-    uint64_t m = 2ull * h.n;
-    Scratch<double> r;
-    if (!r.Allocate(m))
+    uint32_t n = h.n;
+    uint64_t m = 2ull * n;
+    SplitSystem system = {h, pin0, pin1, {}, {}};
+    Scratch<double> y, r, p, q, t, w;
+    if (!system.Factor() || !y.Allocate(m) || !r.Allocate(m) || !p.Allocate(m) || !q.Allocate(m) || !t.Allocate(m) ||
+        !w.Allocate(m))
         return kSolveOutOfMemory;
-    Residual(h, x, r.Data(), pin0, pin1);
-    double start = DotN(r.Data(), r.Data(), m);
-    double stop = control.relative * start > control.absolute ? control.relative * start : control.absolute;
-    if (start <= stop)
+    // The residual of the start, -H x at the free unknowns, carried into the split system:
+    // r = D^1/2 (D + L)^-1 (-H x). Its squared norm is the residual's M^-1 norm.
+    h.Multiply(x, w.Data());
+    for (uint64_t i = 0; i < m; ++i)
+        w[i] = -w[i];
+    system.Forward(w.Data(), r.Data());
+    double floor = 0;
+    for (uint32_t i = 0; i < n; ++i)
+    {
+        r[2 * i] *= system.root[i];
+        r[2 * i + 1] *= system.root[i];
+        double component = control.resolution * h.diag[i];
+        floor += system.Pinned(i) ? 0 : 2 * component * component / system.d[i];
+    }
+    double rr = DotN(r.Data(), r.Data(), m);
+    double stop = control.relative * rr > floor ? control.relative * rr : floor;
+    if (rr <= stop)
         return 0;
-    return ConjugateGradients(h, x, r.Data(), pin0, pin1, stop, control.maxIterations);
+    // Conjugate gradients on S y = r from y = 0, the correction of x in split form.
+    memset(y.Data(), 0, m * sizeof(double));
+    memcpy(p.Data(), r.Data(), m * sizeof(double));
+    uint32_t it = 0;
+    while (it < control.maxIterations)
+    {
+        ++it;
+        system.Apply(p.Data(), q.Data(), t.Data(), w.Data());
+        double pq = DotN(p.Data(), q.Data(), m);
+        if (!(pq > 0))
+            break;
+        double alpha = rr / pq, next = 0;   // one pass: the same sums in the same order
+        for (uint64_t i = 0; i < m; ++i)
+        {
+            y[i] += alpha * p[i];
+            r[i] -= alpha * q[i];
+            next += r[i] * r[i];
+        }
+        if (next <= stop)
+            break;
+        double beta = next / rr;
+        rr = next;
+        for (uint64_t i = 0; i < m; ++i)
+            p[i] = r[i] + beta * p[i];
+    }
+    // x += (D + L^H)^-1 D^1/2 y
+    for (uint32_t i = 0; i < n; ++i)
+    {
+        w[2 * i] = system.root[i] * y[2 * i];
+        w[2 * i + 1] = system.root[i] * y[2 * i + 1];
+    }
+    system.Backward(w.Data(), t.Data());
+    for (uint64_t i = 0; i < m; ++i)
+        x[i] += t[i];
+    return it;
 }
