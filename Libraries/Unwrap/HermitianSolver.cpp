@@ -79,28 +79,47 @@ namespace
 
         // q = S p with S = D^1/2 (D + L)^-1 H (D + L^H)^-1 D^1/2, the preconditioned matrix, without
         // a product with H (Eisenstat): with t = (D + L^H)^-1 D^1/2 p and H = (D + L) + (D + L^H) -
-        // (2 D - diag H), S p = D^1/2 (t + (D + L)^-1 (D^1/2 p - (2 D - diag H) t)). w: scratch.
-        void Apply(const double* p, double* q, double* t, double* w) const
+        // (2 D - diag H), S p = D^1/2 (t + (D + L)^-1 (D^1/2 p - (2 D - diag H) t)). The scalings
+        // are done inside the two sweeps, the search direction p is first made r + beta p there (each
+        // p_i is read by its own row only), and p . q is summed as q is made. s: scratch.
+        double Apply(const double* r, double beta, double* p, double* q, double* t, double* s) const
         {
             uint32_t n = h.n;
-            for (uint32_t i = 0; i < n; ++i)
+            for (uint32_t i = n; i-- > 0;)   // p = r + beta p; t = (D + L^H)^-1 D^1/2 p
             {
-                w[2 * i] = root[i] * p[2 * i];
-                w[2 * i + 1] = root[i] * p[2 * i + 1];
+                p[2 * i] = r[2 * i] + beta * p[2 * i];
+                p[2 * i + 1] = r[2 * i + 1] + beta * p[2 * i + 1];
+                double u = root[i] * p[2 * i], v = root[i] * p[2 * i + 1];
+                for (uint32_t a = h.rowStart[i + 1]; a-- > h.rowStart[i] && h.entries[a].column > i;)
+                {
+                    const MatrixEntry& e = h.entries[a];
+                    double tu = t[2 * e.column], tv = t[2 * e.column + 1];
+                    u -= e.laplace * tu - e.area * tv;
+                    v -= e.area * tu + e.laplace * tv;
+                }
+                t[2 * i] = Pinned(i) ? 0 : u / d[i];
+                t[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
             }
-            Backward(w, t);
-            for (uint32_t i = 0; i < n; ++i)
+            double pq = 0;
+            for (uint32_t i = 0; i < n; ++i)   // s = (D + L)^-1 (D^1/2 p - (2 D - diag H) t), q
             {
                 double k = 2 * d[i] - h.diag[i];
-                w[2 * i] -= k * t[2 * i];
-                w[2 * i + 1] -= k * t[2 * i + 1];
+                double u = root[i] * p[2 * i] - k * t[2 * i], v = root[i] * p[2 * i + 1] - k * t[2 * i + 1];
+                for (uint32_t a = h.rowStart[i]; a < h.rowStart[i + 1] && h.entries[a].column < i; ++a)
+                {
+                    const MatrixEntry& e = h.entries[a];
+                    double su = s[2 * e.column], sv = s[2 * e.column + 1];
+                    u -= e.laplace * su - e.area * sv;
+                    v -= e.area * su + e.laplace * sv;
+                }
+                s[2 * i] = Pinned(i) ? 0 : u / d[i];
+                s[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
+                q[2 * i] = Pinned(i) ? 0 : root[i] * (t[2 * i] + s[2 * i]);
+                q[2 * i + 1] = Pinned(i) ? 0 : root[i] * (t[2 * i + 1] + s[2 * i + 1]);
+                pq += p[2 * i] * q[2 * i];
+                pq += p[2 * i + 1] * q[2 * i + 1];
             }
-            Forward(w, q);
-            for (uint32_t i = 0; i < n; ++i)
-            {
-                q[2 * i] = Pinned(i) ? 0 : root[i] * (t[2 * i] + q[2 * i]);
-                q[2 * i + 1] = Pinned(i) ? 0 : root[i] * (t[2 * i + 1] + q[2 * i + 1]);
-            }
+            return pq;
         }
     };
 
@@ -142,13 +161,13 @@ uint32_t SolvePinned(const HermitianMatrix& h, double* x, uint32_t pin0, uint32_
         return 0;
     // Conjugate gradients on S y = r from y = 0, the correction of x in split form.
     memset(y.Data(), 0, m * sizeof(double));
-    memcpy(p.Data(), r.Data(), m * sizeof(double));
+    memset(p.Data(), 0, m * sizeof(double));   // the first direction is r itself (beta 0)
     uint32_t it = 0;
+    double beta = 0;
     while (it < control.maxIterations)
     {
         ++it;
-        system.Apply(p.Data(), q.Data(), t.Data(), w.Data());
-        double pq = DotN(p.Data(), q.Data(), m);
+        double pq = system.Apply(r.Data(), beta, p.Data(), q.Data(), t.Data(), w.Data());
         if (!(pq > 0))
             break;
         double alpha = rr / pq, next = 0;   // one pass: the same sums in the same order
@@ -160,10 +179,8 @@ uint32_t SolvePinned(const HermitianMatrix& h, double* x, uint32_t pin0, uint32_
         }
         if (next <= stop)
             break;
-        double beta = next / rr;
+        beta = next / rr;
         rr = next;
-        for (uint64_t i = 0; i < m; ++i)
-            p[i] = r[i] + beta * p[i];
     }
     // x += (D + L^H)^-1 D^1/2 y
     for (uint32_t i = 0; i < n; ++i)
