@@ -40,38 +40,50 @@ namespace
             return true;
         }
 
+        // (u, v) -= the lower (below the diagonal) or upper part of row i times w.
+        void SubtractLower(uint32_t i, const double* w, double* u, double* v) const
+        {
+            for (uint32_t a = h.rowStart[i]; a < h.rowStart[i + 1] && h.entries[a].column < i; ++a)
+            {
+                const MatrixEntry& e = h.entries[a];
+                double wu = w[2 * e.column], wv = w[2 * e.column + 1];
+                *u -= e.laplace * wu - e.area * wv;
+                *v -= e.area * wu + e.laplace * wv;
+            }
+        }
+        void SubtractUpper(uint32_t i, const double* w, double* u, double* v) const
+        {
+            for (uint32_t a = h.rowStart[i + 1]; a-- > h.rowStart[i] && h.entries[a].column > i;)
+            {
+                const MatrixEntry& e = h.entries[a];
+                double wu = w[2 * e.column], wv = w[2 * e.column + 1];
+                *u -= e.laplace * wu - e.area * wv;
+                *v -= e.area * wu + e.laplace * wv;
+            }
+        }
+
         // w = (D + L)^-1 s, rows in ascending order; zero at the pins.
         void Forward(const double* s, double* w) const
         {
             for (uint32_t i = 0; i < h.n; ++i)
             {
                 double u = s[2 * i], v = s[2 * i + 1];
-                for (uint32_t a = h.rowStart[i]; a < h.rowStart[i + 1] && h.entries[a].column < i; ++a)
-                {
-                    const MatrixEntry& e = h.entries[a];
-                    double wu = w[2 * e.column], wv = w[2 * e.column + 1];   // zero at the pins
-                    u -= e.laplace * wu - e.area * wv;
-                    v -= e.area * wu + e.laplace * wv;
-                }
+                SubtractLower(i, w, &u, &v);   // w is zero at the pins
                 w[2 * i] = Pinned(i) ? 0 : u / d[i];
                 w[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
             }
         }
 
-        // t = (D + L^H)^-1 s, rows in descending order over their upper entries (H is Hermitian:
-        // row i of L^H is the upper part of H's row i); zero at the pins.
-        void Backward(const double* s, double* t) const
+        // p = r + beta p, then t = (D + L^H)^-1 D^1/2 p, rows in descending order (each p_i is read
+        // by its own row only); t is zero at the pins.
+        void Backward(const double* r, double beta, double* p, double* t) const
         {
             for (uint32_t i = h.n; i-- > 0;)
             {
-                double u = s[2 * i], v = s[2 * i + 1];
-                for (uint32_t a = h.rowStart[i + 1]; a-- > h.rowStart[i] && h.entries[a].column > i;)
-                {
-                    const MatrixEntry& e = h.entries[a];
-                    double tu = t[2 * e.column], tv = t[2 * e.column + 1];
-                    u -= e.laplace * tu - e.area * tv;
-                    v -= e.area * tu + e.laplace * tv;
-                }
+                p[2 * i] = r[2 * i] + beta * p[2 * i];
+                p[2 * i + 1] = r[2 * i + 1] + beta * p[2 * i + 1];
+                double u = root[i] * p[2 * i], v = root[i] * p[2 * i + 1];
+                SubtractUpper(i, t, &u, &v);   // row i of L^H is the upper part of H's row i
                 t[2 * i] = Pinned(i) ? 0 : u / d[i];
                 t[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
             }
@@ -80,38 +92,17 @@ namespace
         // q = S p with S = D^1/2 (D + L)^-1 H (D + L^H)^-1 D^1/2, the preconditioned matrix, without
         // a product with H (Eisenstat): with t = (D + L^H)^-1 D^1/2 p and H = (D + L) + (D + L^H) -
         // (2 D - diag H), S p = D^1/2 (t + (D + L)^-1 (D^1/2 p - (2 D - diag H) t)). The scalings
-        // are done inside the two sweeps, the search direction p is first made r + beta p there (each
-        // p_i is read by its own row only), and p . q is summed as q is made. s: scratch.
+        // are done inside the two sweeps, the search direction p is first made r + beta p there,
+        // and p . q is summed as q is made. s: scratch.
         double Apply(const double* r, double beta, double* p, double* q, double* t, double* s) const
         {
-            uint32_t n = h.n;
-            for (uint32_t i = n; i-- > 0;)   // p = r + beta p; t = (D + L^H)^-1 D^1/2 p
-            {
-                p[2 * i] = r[2 * i] + beta * p[2 * i];
-                p[2 * i + 1] = r[2 * i + 1] + beta * p[2 * i + 1];
-                double u = root[i] * p[2 * i], v = root[i] * p[2 * i + 1];
-                for (uint32_t a = h.rowStart[i + 1]; a-- > h.rowStart[i] && h.entries[a].column > i;)
-                {
-                    const MatrixEntry& e = h.entries[a];
-                    double tu = t[2 * e.column], tv = t[2 * e.column + 1];
-                    u -= e.laplace * tu - e.area * tv;
-                    v -= e.area * tu + e.laplace * tv;
-                }
-                t[2 * i] = Pinned(i) ? 0 : u / d[i];
-                t[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
-            }
+            Backward(r, beta, p, t);
             double pq = 0;
-            for (uint32_t i = 0; i < n; ++i)   // s = (D + L)^-1 (D^1/2 p - (2 D - diag H) t), q
+            for (uint32_t i = 0; i < h.n; ++i)   // s = (D + L)^-1 (D^1/2 p - (2 D - diag H) t), q
             {
                 double k = 2 * d[i] - h.diag[i];
                 double u = root[i] * p[2 * i] - k * t[2 * i], v = root[i] * p[2 * i + 1] - k * t[2 * i + 1];
-                for (uint32_t a = h.rowStart[i]; a < h.rowStart[i + 1] && h.entries[a].column < i; ++a)
-                {
-                    const MatrixEntry& e = h.entries[a];
-                    double su = s[2 * e.column], sv = s[2 * e.column + 1];
-                    u -= e.laplace * su - e.area * sv;
-                    v -= e.area * su + e.laplace * sv;
-                }
+                SubtractLower(i, s, &u, &v);
                 s[2 * i] = Pinned(i) ? 0 : u / d[i];
                 s[2 * i + 1] = Pinned(i) ? 0 : v / d[i];
                 q[2 * i] = Pinned(i) ? 0 : root[i] * (t[2 * i] + s[2 * i]);
@@ -182,13 +173,8 @@ uint32_t SolvePinned(const HermitianMatrix& h, double* x, uint32_t pin0, uint32_
         beta = next / rr;
         rr = next;
     }
-    // x += (D + L^H)^-1 D^1/2 y
-    for (uint32_t i = 0; i < n; ++i)
-    {
-        w[2 * i] = system.root[i] * y[2 * i];
-        w[2 * i + 1] = system.root[i] * y[2 * i + 1];
-    }
-    system.Backward(w.Data(), t.Data());
+    // x += (D + L^H)^-1 D^1/2 y (p: scratch)
+    system.Backward(y.Data(), 0, p.Data(), t.Data());
     for (uint64_t i = 0; i < m; ++i)
         x[i] += t[i];
     return it;
