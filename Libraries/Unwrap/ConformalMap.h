@@ -12,7 +12,7 @@
 // The result is scaled so that the chart's UV area equals its 3D area (one unit for all charts).
 // Input: the chart's triangles, none degenerate. Output: FlatChart, the chart's own vertex numbers
 // (first use order) and one UV a vertex: corners of one vertex share it by construction.
-// Cost: O(k * nnz) for k iterations (at most 50 + 6 sqrt(n) for n chart vertices); memory about 200
+// Cost: O(k * nnz) for k iterations (at most 50 + 5 sqrt(n) for n chart vertices); memory about 200
 // bytes a chart vertex, released with the FlatChart.
 #pragma once
 
