@@ -5,6 +5,8 @@
 
 namespace
 {
+    const double kWrapLimit = 6.283185307179586 - 0.35;   // a full turn less 20 degrees
+
     Vec3 Centroid(const ChartMesh& mesh, uint32_t t)
     {
         const uint32_t* v = mesh.tri + 3 * t;
@@ -19,9 +21,11 @@ bool ChartGrower::Allocate(const ChartMesh& mesh, uint32_t* chartOf)
     m_ChartOf = chartOf;
     uint64_t T = mesh.triCount + 1ull;
     if (!m_Heap.Allocate(1024) || !Reserve(255) || !m_Distance.Allocate(T) || !m_Polygon.Allocate(T) ||
-        !m_Rejected.Allocate(T) || !m_Queued.Allocate(T))
+        !m_Rejected.Allocate(T) || !m_Queued.Allocate(T) || !m_Share.Allocate(mesh.vertexCount + 1ull))
         return false;
     memset(m_Queued.Data(), 0, mesh.triCount);
+    for (uint32_t v = 0; v < mesh.vertexCount; ++v)
+        m_Share[v] = {kNoChart, 0, 0};
     return true;
 }
 
@@ -31,8 +35,9 @@ bool ChartGrower::Reserve(uint32_t chart)
         return true;
     uint64_t capacity = m_ProxyCapacity ? 2ull * m_ProxyCapacity : 256;
     capacity = capacity > chart ? capacity : chart + 1ull;
-    if (!m_Proxy.Grow(m_ProxyCapacity, capacity))
+    if (!m_Proxy.Grow(m_ProxyCapacity, capacity) || !m_Generation.Grow(m_ProxyCapacity, capacity))
         return false;
+    memset(m_Generation.Data() + m_ProxyCapacity, 0, (capacity - m_ProxyCapacity) * sizeof(uint32_t));
     m_ProxyCapacity = (uint32_t)capacity;
     return true;
 }
@@ -55,34 +60,59 @@ double ChartGrower::Cost(uint32_t f, uint32_t c, const GrowRules& rules) const
 // Adding f to chart c would break the chart at one of f's corners: either pinch it (the vertex
 // already belongs to c, but neither of f's edges at it links to a triangle of c, so the chart
 // would touch itself there), or wrap it (the chart's 3D angles around the vertex would pass
-// 2 pi - kWrapMargin while the fan stays open: its conformal map would fold over itself).
+// kWrapLimit, 20 degrees short of a full turn, while the fan stays open: its conformal map would fold over itself).
+// The vertex's share (see m_Share) answers without a walk around it when the vertex belongs to
+// no chart, or to c alone with room left below the wrap limit.
 bool ChartGrower::BreaksAtCorner(uint32_t f, uint32_t c) const
 {
-    const double kWrapMargin = 0.35;   // 20 degrees
-    const double kFullTurn = 6.283185307179586;
     const ChartMesh& mesh = *m_Mesh;
     for (uint32_t k = 0; k < 3; ++k)
     {
         uint32_t h = 3 * f + k, previous = 3 * f + (k + 2) % 3;   // the two edges at corner k
         bool linked = (mesh.twin[h] != kNoTwin && m_ChartOf[mesh.twin[h] / 3] == c) ||
                       (mesh.twin[previous] != kNoTwin && m_ChartOf[mesh.twin[previous] / 3] == c);
-        uint32_t v = mesh.tri[h];
-        double angle = mesh.cornerAngle[h];
-        uint32_t inChart = 1, all = mesh.aroundStart[v + 1] - mesh.aroundStart[v];
-        for (uint32_t i = mesh.aroundStart[v]; i < mesh.aroundStart[v + 1]; ++i)
-        {
-            uint32_t corner = mesh.around[i];
-            if (m_ChartOf[corner / 3] != c)
-                continue;
-            if (!linked)
-                return true;
-            ++inChart;
-            angle += mesh.cornerAngle[corner];
-        }
-        if (angle > kFullTurn - kWrapMargin && inChart < all)
+        uint32_t holder = Holder(mesh.tri[h]);
+        if (holder == kNoChart)
+            continue;   // a single corner angle is below pi: nothing to pinch or wrap
+        if (holder == c && !linked)
+            return true;
+        if (holder == c && m_Share[mesh.tri[h]].angle + mesh.cornerAngle[h] <= kWrapLimit - 1e-3)
+            continue;
+        if (holder != c && holder != kMixedCharts)
+            continue;   // c has no triangle at v
+        if (WalkBreaks(h, c, linked))
             return true;
     }
     return false;
+}
+
+// The chart that alone holds v, kNoChart when none does, kMixedCharts when the share cannot tell.
+uint32_t ChartGrower::Holder(uint32_t v) const
+{
+    const VertexShare& share = m_Share[v];
+    if (share.chart == kNoChart || share.chart == kMixedCharts)
+        return share.chart;
+    return share.generation == m_Generation[share.chart] ? share.chart : kNoChart;
+}
+
+// The walk around corner h's vertex that BreaksAtCorner saves where it can.
+bool ChartGrower::WalkBreaks(uint32_t h, uint32_t c, bool linked) const
+{
+    const ChartMesh& mesh = *m_Mesh;
+    uint32_t v = mesh.tri[h];
+    double angle = mesh.cornerAngle[h];
+    uint32_t inChart = 1, all = mesh.aroundStart[v + 1] - mesh.aroundStart[v];
+    for (uint32_t i = mesh.aroundStart[v]; i < mesh.aroundStart[v + 1]; ++i)
+    {
+        uint32_t corner = mesh.around[i];
+        if (m_ChartOf[corner / 3] != c)
+            continue;
+        if (!linked)
+            return true;
+        ++inChart;
+        angle += mesh.cornerAngle[corner];
+    }
+    return angle > kWrapLimit && inChart < all;
 }
 
 // The checks are pure: the cheap ones go first, the walk around f's corners last.
@@ -104,6 +134,17 @@ void ChartGrower::Add(uint32_t f, uint32_t c, double cost, const GrowRules& rule
     m_ChartOf[f] = c;
     if (rules.geodesic)   // read only by geodesic growing: other rules leave its pages untouched
         m_Distance[f] = cost;
+    for (uint32_t k = 0; k < 3; ++k)
+    {
+        uint32_t v = m_Mesh->tri[3 * f + k], holder = Holder(v);
+        VertexShare& share = m_Share[v];
+        if (holder == kNoChart)
+            share = {c, m_Generation[c], 0};
+        if (holder == kNoChart || holder == c)
+            share.angle += m_Mesh->cornerAngle[3 * f + k];
+        else
+            share.chart = kMixedCharts;
+    }
     if (!rules.fixedProxies)
     {
         proxy.normalSum = proxy.normalSum + m_Mesh->normal[f] * m_Mesh->area[f];
@@ -169,6 +210,7 @@ void ChartGrower::Seed(uint32_t seed, uint32_t chart, const GrowRules& rules)
         m_Failed = true;
         return;
     }
+    ++m_Generation[chart];   // the shares the chart's earlier triangles left are void
     ChartProxy& proxy = m_Proxy[chart];
     if (!rules.fixedProxies)
         proxy.normalSum = {0, 0, 0};

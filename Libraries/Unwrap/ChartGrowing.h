@@ -19,7 +19,7 @@
 // (srcPoly) join a chart whole: when one of their triangles joins, the rest of the polygon joins
 // with it, whatever the limits say.
 // Every order is decided by costs, then triangle numbers: runs are reproducible bit for bit.
-// Cost: O(n log n) for n triangles grown; memory 17 bytes a triangle of the mesh, 16 bytes a
+// Cost: O(n log n) for n triangles grown; memory 17 bytes a triangle and 12 a vertex of the mesh, 16 bytes a
 // candidate queued at once (the growing fronts and stale entries; the heap doubles when full),
 // 72 bytes a chart.
 #pragma once
@@ -66,8 +66,10 @@ public:
     // True once a proxy could not get memory: the growing since then is incomplete.
     bool Failed() const { return m_Failed; }
 
-    // Puts `seed` into chart `chart` (a fresh proxy from the seed unless the rules fix proxies, in
-    // which case the proxy's normalSum is kept and its curvature and area restart from the seed).
+    // Puts `seed` into chart `chart`, which must hold no triangle (a number not used yet, or one
+    // whose triangles were all put back to kNoChart since), with a fresh proxy from the seed
+    // unless the rules fix proxies, in which case the proxy's normalSum is kept and its curvature
+    // and area restart from the seed.
     void Seed(uint32_t seed, uint32_t chart, const GrowRules& rules);
 
     // Grows all seeded charts until no admissible candidate is left.
@@ -86,6 +88,8 @@ private:
     void Reject(uint32_t f);
     bool Admissible(uint32_t f, uint32_t c, const GrowRules& rules) const;
     bool BreaksAtCorner(uint32_t f, uint32_t c) const;
+    bool WalkBreaks(uint32_t h, uint32_t c, bool linked) const;
+    uint32_t Holder(uint32_t v) const;
     void Add(uint32_t f, uint32_t c, double cost, const GrowRules& rules);
 
     const ChartMesh* m_Mesh = nullptr;
@@ -100,5 +104,18 @@ private:
     Scratch<uint32_t> m_Polygon;    // stack of the triangles joining with a source polygon
     Scratch<uint32_t> m_Rejected;   // FIFO of triangles some chart turned down
     Scratch<uint8_t> m_Queued;      // 1 once a triangle is in m_Rejected
+    // Per vertex, what the grower has seen of it: the one chart that took triangles there, with
+    // that chart's generation then and the sum of its 3D angles there; kMixedCharts once a second
+    // chart does (then only a walk around the vertex tells). Seeding a chart starts a new
+    // generation of it: shares from its earlier life (triangles put back outside the grower) no
+    // longer count. Spares most walks around vertices in BreaksAtCorner.
+    struct VertexShare
+    {
+        uint32_t chart, generation;
+        float angle;
+    };
+    static const uint32_t kMixedCharts = 0xFFFFFFFEu;
+    Scratch<VertexShare> m_Share;
+    Scratch<uint32_t> m_Generation;   // per chart, with the proxies
     uint32_t m_RejectedHead = 0, m_RejectedTail = 0;
 };

@@ -6,15 +6,14 @@
 // E is a quadratic form whose matrix is [[L, -B], [B, L]] with L the cotangent Laplacian and B the
 // skew matrix of the area form (1/2 per directed triangle edge), positive semi-definite with the
 // similarity maps as its null space; pinning two vertices makes it positive definite, so it is
-// solved by conjugate gradients (Jacobi preconditioner) started from the chart's projection onto
-// its mean plane, pins at the projection's extremes along the first axis, at their 3D distance.
+// solved by conjugate gradients (HermitianSolver.h) started from the chart's projection onto its
+// mean plane, pins at the projection's extremes along the first axis, at their 3D distance. A
+// nearly planar chart keeps its projection: the solve stops below what float UVs resolve.
 // The result is scaled so that the chart's UV area equals its 3D area (one unit for all charts).
 // Input: the chart's triangles, none degenerate. Output: FlatChart, the chart's own vertex numbers
 // (first use order) and one UV a vertex: corners of one vertex share it by construction.
-// Cost: O(k * nnz) for k iterations (at most a few hundred on large charts); memory at the peak
-// about 190 bytes a chart triangle: the matrix (72), the incomplete factor and its unpacked copy
-// (80), the FlatChart (22); the solver's four vectors (32) come once the copy is gone. All but
-// the FlatChart is gone when Flatten returns.
+// Cost: O(k * nnz) for k iterations (at most 50 + 5 sqrt(n) for n chart vertices); memory about 200
+// bytes a chart vertex, released with the FlatChart.
 #pragma once
 
 #include "ChartMesh.h"

@@ -1,6 +1,7 @@
-// A binary min-heap of (cost, triangle, chart) entries with a fixed capacity, for chart growing.
-// Ties in cost go to the lower triangle, then the lower chart, so the order of pops is fully
-// determined by the entries (byte-identical runs).
+// A 4-ary min-heap of (cost, triangle, chart) entries, for chart growing: half the levels of a
+// binary heap, and the four children of an entry share a cache line or two, so a pop costs fewer
+// misses. Ties in cost go to the lower triangle, then the lower chart: the order of pops is fully
+// determined by the entries, whatever the heap's shape (byte-identical runs).
 #pragma once
 
 #include "Scratch.h"
@@ -35,10 +36,10 @@ public:
             m_Capacity = 2 * m_Capacity + 16;
         }
         uint64_t i = m_Size++;
-        while (i > 0 && Before(entry, m_Entries[(i - 1) / 2]))
+        while (i > 0 && Before(entry, m_Entries[(i - 1) / 4]))
         {
-            m_Entries[i] = m_Entries[(i - 1) / 2];
-            i = (i - 1) / 2;
+            m_Entries[i] = m_Entries[(i - 1) / 4];
+            i = (i - 1) / 4;
         }
         m_Entries[i] = entry;
         return true;
@@ -50,11 +51,11 @@ public:
         uint64_t i = 0;
         for (;;)
         {
-            uint64_t child = 2 * i + 1;
-            if (child >= m_Size)
+            uint64_t first = 4 * i + 1, child = first;
+            if (first >= m_Size)
                 break;
-            if (child + 1 < m_Size && Before(m_Entries[child + 1], m_Entries[child]))
-                ++child;
+            for (uint64_t k = first + 1; k < first + 4 && k < m_Size; ++k)
+                child = Before(m_Entries[k], m_Entries[child]) ? k : child;
             if (!Before(m_Entries[child], last))
                 break;
             m_Entries[i] = m_Entries[child];

@@ -272,6 +272,34 @@ namespace
         return mesh;
     }
 
+    // A strip of needles: `rows` rows of `cells` triangle pairs, each row shifted half a cell
+    // against the last and only `spacing` of a cell away, so that every triangle has a corner near
+    // 180 degrees; bent round a cylinder as wide as the strip is long.
+    Mesh NeedleStrip(uint32_t cells, uint32_t rows, double spacing)
+    {
+        Mesh mesh;
+        for (uint32_t j = 0; j <= rows; ++j)
+            for (uint32_t i = 0; i <= cells; ++i)
+            {
+                double angle = (i + 0.5 * (j % 2)) / cells;
+                mesh.Add(float(cells * std::sin(angle)), float(j * spacing), float(cells * (1 - std::cos(angle))));
+            }
+        auto at = [cells](uint32_t i, uint32_t j) { return j * (cells + 1) + i; };
+        for (uint32_t j = 0; j < rows; ++j)
+            for (uint32_t i = 0; i < cells; ++i)
+                if (j % 2 == 0)
+                {
+                    mesh.Face(at(i, j), at(i + 1, j), at(i, j + 1));
+                    mesh.Face(at(i + 1, j), at(i + 1, j + 1), at(i, j + 1));
+                }
+                else
+                {
+                    mesh.Face(at(i, j), at(i + 1, j + 1), at(i, j + 1));
+                    mesh.Face(at(i, j), at(i + 1, j), at(i + 1, j + 1));
+                }
+        return mesh;
+    }
+
     // A unit sphere of `around` x `rings` quads (triangles at the poles).
     Mesh Sphere(uint32_t around, uint32_t rings)
     {
@@ -617,6 +645,29 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
         CHECK(splits > 0);
         CHECK(charts >= segmented + splits);
         CHECK(angle <= 0.002 && area <= 0.15);
+    }
+
+    TEST_FIXTURE(ChartsFixture, Needles_ObtuseTrianglesEverywhereStillFlattenAsOneChart)
+    {
+        // Corners near 180 degrees give the conformal matrix large positive off-diagonal entries:
+        // eliminating it meets pivots that are not positive, which the solver must survive
+        // (without that, the map goes wrong and the strip is split into hundreds of charts).
+        Mesh strip = NeedleStrip(24, 24, 0.05);
+        std::ofstream(dir + "/mesh.bin", std::ios::binary) << BinaryMesh(strip, Params(), {});
+        Testing::ChildResult r = Testing::RunProgram({std::string(CHARTBAKE_BIN_DIR) + "/ChartBake", "mesh.bin", "out.bin"}, dir,
+                                                     {"CHARTBAKE_LIBRARY_BEHAVIOUR=unwrap-report-stats"});
+        CHECK_EQUAL(0, r.exitStatus);
+        unsigned segmented = 0, splits = 1, charts = 0, cuts = 0;
+        double angle = 1, area = 1;
+        CHECK_EQUAL(6, std::sscanf(r.out.c_str(), "segmented %u charts, %u splits, %u charts, angle distortion %lf, area distortion %lf, %u cuts",
+                                   &segmented, &splits, &charts, &angle, &area, &cuts));
+        CHECK_EQUAL(1u, segmented);
+        CHECK_EQUAL(0u, splits);
+        // The long strip may still be cut into pieces that pack better; each cut adds one chart.
+        CHECK_EQUAL(1u + cuts, charts);
+        Layout layout = Unwrap(strip);
+        CHECK_EQUAL(charts, ChartCount(Charts(layout)));
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, false));
     }
 
     TEST_FIXTURE(ChartsFixture, Sliver_ThinnerThanFloatUVsResolveStillUnwraps)
