@@ -494,6 +494,33 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
             CHECK_EQUAL(charts[t], charts[t + 1]);
     }
 
+    TEST_FIXTURE(ChartsFixture, SourcePolygon_ALongStripIsCutOnlyBetweenItsPolygons)
+    {
+        // A 120:1 strip is too long for the square and gets cut across; its five source
+        // polygons (48 x 2 quads each) must stay whole, so every cut runs between two of them,
+        // though the cutter's first choice of levels (sixths of the length) lies inside them.
+        const uint32_t columns = 240, rows = 2, block = 48;
+        Mesh strip;
+        for (uint32_t x = 0; x <= columns; ++x)
+            for (uint32_t y = 0; y <= rows; ++y)
+                strip.Add(float(x), float(y), 0);
+        std::vector<uint32_t> srcPoly;
+        for (uint32_t x = 0; x < columns; ++x)
+            for (uint32_t y = 0; y < rows; ++y)
+            {
+                uint32_t a = x * (rows + 1) + y, b = a + rows + 1;
+                strip.Face(a, b, b + 1);
+                strip.Face(a, b + 1, a + 1);
+                srcPoly.insert(srcPoly.end(), 2, x / block);
+            }
+        Layout layout = Unwrap(strip, Params(), srcPoly);
+        CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, false));
+        std::vector<uint32_t> charts = Charts(layout);
+        CHECK(ChartCount(charts) >= 2);
+        for (uint32_t t = 0; t < strip.TriCount() && !charts.empty(); ++t)
+            CHECK_EQUAL(charts[t - t % (2 * rows * block)], charts[t]);
+    }
+
     TEST_FIXTURE(ChartsFixture, RecollectVertices_WeldsSplitVerticesIntoOneChart)
     {
         // A square whose two triangles have their own copies of the diagonal's vertices.
