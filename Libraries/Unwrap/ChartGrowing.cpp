@@ -5,8 +5,6 @@
 
 namespace
 {
-    const double kWrapLimit = 6.283185307179586 - 0.35;   // a full turn less 20 degrees
-
     Vec3 Centroid(const ChartMesh& mesh, uint32_t t)
     {
         const uint32_t* v = mesh.tri + 3 * t;

@@ -28,6 +28,10 @@
 #include "MinHeap.h"
 #include "../Tessary/TessaryApi.h"
 
+// The most 3D angle a chart may gather around a vertex while its fan there stays open: a full
+// turn less 20 degrees (a conformal map of a wider open fan folds over itself).
+const double kWrapLimit = 6.283185307179586 - 0.35;
+
 struct GrowRules
 {
     double cosNormalLimit;   // below -1: no limit

@@ -160,10 +160,103 @@ namespace
         return m;
     }
 
+    // --- Merges that would wrap a vertex ----------------------------------------------------
+    // Two charts that both hold corners at a vertex v, whose 3D angles there together pass
+    // kWrapLimit while the union's fan at v stays open (v on a border of the cut surface, or a
+    // third chart at v), would make a chart that folds over itself in its conformal map: the
+    // flattening checks would split it again, into more pieces than the two it came from.
+    // WrapPairs lists such pairs as sorted keys (smaller chart << 32 | larger chart).
+    struct WrapPairs
+    {
+        Scratch<uint64_t> keys;
+        uint32_t count = 0;
+
+        bool Contains(uint32_t a, uint32_t b) const
+        {
+            uint64_t key = a < b ? (uint64_t)a << 32 | b : (uint64_t)b << 32 | a;
+            uint32_t low = 0, high = count;
+            while (low < high)
+            {
+                uint32_t mid = low + (high - low) / 2;
+                if (keys[mid] < key)
+                    low = mid + 1;
+                else
+                    high = mid;
+            }
+            return low < count && keys[low] == key;
+        }
+    };
+
+    // Calls found(a, b) for every pair of charts that would wrap vertex v. Vertices with more
+    // than kMaxChartsAtVertex charts are left to the flattening checks.
+    const uint32_t kMaxChartsAtVertex = 8;
+    template <typename Found>
+    void WrapsAtVertex(const ChartMesh& mesh, const uint32_t* chartOf, uint32_t v, Found found)
+    {
+        uint32_t chart[kMaxChartsAtVertex], n = 0;
+        double angle[kMaxChartsAtVertex];
+        bool open = false;
+        for (uint32_t i = mesh.aroundStart[v]; i < mesh.aroundStart[v + 1]; ++i)
+        {
+            uint32_t corner = mesh.around[i], into = corner - corner % 3 + (corner % 3 + 2) % 3;
+            open = open || mesh.twin[corner] == kNoTwin || mesh.twin[into] == kNoTwin;
+            uint32_t c = chartOf[corner / 3], k = 0;
+            if (c == kNoChart)
+            {
+                open = true;
+                continue;
+            }
+            while (k < n && chart[k] != c)
+                ++k;
+            if (k == n)
+            {
+                if (n == kMaxChartsAtVertex)
+                    return;
+                chart[n] = c, angle[n++] = 0;
+            }
+            angle[k] += mesh.cornerAngle[corner];
+        }
+        open = open || n > 2;
+        for (uint32_t i = 0; open && i < n; ++i)
+            for (uint32_t j = i + 1; j < n; ++j)
+                if (angle[i] + angle[j] > kWrapLimit)
+                    found(chart[i], chart[j]);
+    }
+
+    // False when scratch memory runs out. Cost: one walk around every vertex.
+    bool CollectWrapPairs(const ChartMesh& mesh, const uint32_t* chartOf, WrapPairs* pairs)
+    {
+        uint64_t count = 0;
+        for (uint32_t v = 0; v < mesh.vertexCount; ++v)
+            WrapsAtVertex(mesh, chartOf, v, [&count](uint32_t, uint32_t) { ++count; });
+        pairs->count = 0;
+        if (count == 0)
+            return true;
+        if (count > 0xFFFFFFF0ull || !pairs->keys.Allocate(count))
+            return false;
+        uint64_t* keys = pairs->keys.Data();
+        for (uint32_t v = 0; v < mesh.vertexCount; ++v)
+            WrapsAtVertex(mesh, chartOf, v, [keys, pairs](uint32_t a, uint32_t b) {
+                keys[pairs->count++] = a < b ? (uint64_t)a << 32 | b : (uint64_t)b << 32 | a;
+            });
+        uint32_t n = pairs->count;
+        for (uint32_t gap = n / 2; gap > 0; gap = gap == 2 ? 1 : gap * 5 / 11)   // shell sort
+            for (uint32_t i = gap; i < n; ++i)
+            {
+                uint64_t x = keys[i];
+                uint32_t j = i;
+                for (; j >= gap && x < keys[j - gap]; j -= gap)
+                    keys[j] = keys[j - gap];
+                keys[j] = x;
+            }
+        return true;
+    }
+
     // Merges charts pairwise along linked borders while the union stays within the limits. Returns
     // the number of merges made; chartOf keeps the numbers of the surviving charts.
     uint32_t MergePass(const ChartMesh& mesh, const GrowRules& rules, uint32_t charts, uint32_t* chartOf, Border* borders,
-                       Border* sorted, uint32_t* order, uint32_t* first, Cone* cone, ChartProxy* proxy, uint32_t* target)
+                       Border* sorted, uint32_t* order, uint32_t* first, Cone* cone, ChartProxy* proxy, uint32_t* target,
+                       const WrapPairs& wraps)
     {
         SumProxies(mesh, chartOf, charts, proxy);
         for (uint32_t c = 0; c < charts; ++c)
@@ -200,7 +293,7 @@ namespace
                 bool fits = AngleBetweenUnit(axis, cone[a].axis) + cone[a].halfAngle <= angleLimit &&
                             AngleBetweenUnit(axis, cone[b].axis) + cone[b].halfAngle <= angleLimit &&
                             Abs(proxy[a].curvature + proxy[b].curvature) <= rules.curvatureLimit &&
-                            proxy[a].triangles + proxy[b].triangles <= rules.maxTriangles;
+                            proxy[a].triangles + proxy[b].triangles <= rules.maxTriangles && !wraps.Contains(a, b);
                 if (fits)
                 {
                     best = b;
@@ -265,8 +358,11 @@ uint32_t SegmentCharts(const ChartMesh& mesh, const GrowRules& rules, uint32_t l
         return kNoChart;
     for (int pass = 0; pass < 8; ++pass)
     {
+        WrapPairs wraps;
+        if (!CollectWrapPairs(mesh, chartOf, &wraps))
+            return kNoChart;
         if (MergePass(mesh, rules, charts, chartOf, borders.Data(), sorted.Data(), seedOf.Data(), first.Data(), cone.Data(), proxy.Data(),
-                      queue.Data()) == 0)
+                      queue.Data(), wraps) == 0)
             break;
     }
     return RenumberCharts(chartOf, T, charts);

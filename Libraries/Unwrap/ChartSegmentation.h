@@ -11,8 +11,10 @@
 //      and all charts regrown at once from their seeds; what no chart takes gets charts of its own;
 //   3. merging: smallest charts first, a chart joins the neighbour it shares the longest linked
 //      boundary with when the union still keeps every normal within the normal limit of the
-//      union's mean normal and its curvature and size within the limits. Seams (unlinked edges)
-//      never merge. The flattening checks (stage 3) have the last word on merged charts.
+//      union's mean normal and its curvature and size within the limits, and would not wrap a
+//      vertex (the two charts' angles there passing kWrapLimit while the fan stays open, which
+//      growing never does either). Seams (unlinked edges) never merge. The flattening checks
+//      (stage 3) have the last word on merged charts.
 // Cost: O(T log T) a round; memory about 30 bytes a triangle plus the grower's candidate heap.
 #pragma once
 

@@ -697,6 +697,41 @@ INTEGRATION_TEST_SUITE(ChartBakeCharts)
         CHECK_EQUAL("", BrokenPromise(layout, 1.0 / 256, false));
     }
 
+    TEST_FIXTURE(ChartsFixture, SlitSaddle_ChartsThatWouldWrapItsCentreAreNotMerged)
+    {
+        // A wavy disk slit along one radius: its centre gathers about 1.1 full turns of angle, and
+        // the slit leaves its fan open, so one chart holding all of it folds over itself. Grown
+        // charts stop short of that; merging two of them must not make it, or flattening splits
+        // the union again, into dozens of pieces.
+        const uint32_t spokes = 64, rings = 4;
+        Mesh disk;
+        disk.Add(0, 0, 0);
+        for (uint32_t r = 1; r <= rings; ++r)
+            for (uint32_t i = 0; i <= spokes; ++i)   // spoke `spokes` lies on spoke 0: the slit
+            {
+                double angle = 2 * M_PI * i / spokes;
+                disk.Add(float(r * std::cos(angle)), float(r * std::sin(angle)), float(0.3 * r * std::sin(3 * angle)));
+            }
+        for (uint32_t i = 0; i < spokes; ++i)
+            disk.Face(0, 1 + i, 2 + i);
+        for (uint32_t r = 1; r < rings; ++r)
+            for (uint32_t i = 0; i < spokes; ++i)
+            {
+                uint32_t a = 1 + (r - 1) * (spokes + 1) + i, b = a + spokes + 1;
+                disk.Face(a, b, b + 1);
+                disk.Face(a, b + 1, a + 1);
+            }
+        std::ofstream(dir + "/mesh.bin", std::ios::binary) << BinaryMesh(disk, Params(), {});
+        Testing::ChildResult r = Testing::RunProgram({std::string(CHARTBAKE_BIN_DIR) + "/ChartBake", "mesh.bin", "out.bin"}, dir,
+                                                     {"CHARTBAKE_LIBRARY_BEHAVIOUR=unwrap-report-stats"});
+        CHECK_EQUAL(0, r.exitStatus);
+        unsigned segmented = 0, splits = 1, charts = 0;
+        CHECK_EQUAL(3, std::sscanf(r.out.c_str(), "segmented %u charts, %u splits, %u charts", &segmented, &splits, &charts));
+        CHECK_EQUAL(0u, splits);
+        CHECK(segmented >= 2 && charts <= 3);
+        CHECK_EQUAL("", BrokenPromise(Unwrap(disk), 1.0 / 256, false));
+    }
+
     TEST_FIXTURE(ChartsFixture, Sliver_ThinnerThanFloatUVsResolveStillUnwraps)
     {
         // A 200 x 200 grid and, on its border, a triangle 1e-7 high: at the layout's scale its
