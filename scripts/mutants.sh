@@ -57,8 +57,14 @@ build_scratch() {
   nice cmake --build "$build" -j2 --target UnitTests >"$log" 2>&1
 }
 
+# A faulty build may hang or crash and be killed half-way, which leaves the tests' temporary
+# directories behind: they go to a folder of the scratch directory, emptied after every run.
 run_tests() {
-  (cd "$build" && timeout "$test_timeout" ./bin/UnitTests >>"$log" 2>&1)
+  local tmp=$scratch/tmp status=0
+  rm -rf "$tmp" && mkdir -p "$tmp"
+  (cd "$build" && TMPDIR=$tmp timeout "$test_timeout" ./bin/UnitTests >>"$log" 2>&1) || status=$?
+  rm -rf "$tmp"
+  return $status
 }
 
 # Calls the function named $1 with (where, file, substitution, what) for every selected fault.

@@ -1,4 +1,5 @@
-// A fresh directory under /tmp for one test, removed with everything in it when the test ends.
+// A fresh directory under $TMPDIR (/tmp when unset) for one test, removed with everything in it
+// when the test ends.
 // End-to-end tests write their input files here and run the programs with it as the working
 // directory, so that nothing of a run is left behind.
 #pragma once
@@ -15,10 +16,13 @@ namespace Testing
     class TemporaryDirectory
     {
     public:
-        // `prefix` names the directory ("/tmp/<prefix>-XXXXXX") so that a leftover shows its owner.
+        // `prefix` names the directory ("<tmp>/<prefix>-XXXXXX") so that a leftover shows its
+        // owner. A test run killed half-way leaves its directories behind; a harness that kills
+        // runs on purpose sets TMPDIR to a folder of its own and empties it.
         explicit TemporaryDirectory(const std::string& prefix)
         {
-            std::string pattern = "/tmp/" + prefix + "-XXXXXX";
+            const char* base = std::getenv("TMPDIR");
+            std::string pattern = std::string(base && *base ? base : "/tmp") + "/" + prefix + "-XXXXXX";
             if (!mkdtemp(pattern.data()))
                 throw std::runtime_error("could not create a temporary directory " + pattern);
             dir = pattern;
