@@ -11,6 +11,7 @@
 // flattened into a chart that was accepted.
 #pragma once
 
+#include "MeshAdjacency.h"
 #include "UnwrapMath.h"
 
 #include <stdint.h>
@@ -66,7 +67,7 @@ struct EdgeLengths
     const uint32_t* tri;
     float operator[](uint32_t h) const
     {
-        uint32_t next = h % 3 == 2 ? h - 2 : h + 1;
+        uint32_t next = NextCorner(h);
         return (float)Length(Position(vertex, tri[next]) - Position(vertex, tri[h]));
     }
 };

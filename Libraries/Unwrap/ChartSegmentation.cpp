@@ -198,7 +198,7 @@ namespace
         bool open = false;
         for (uint32_t i = mesh.aroundStart[v]; i < mesh.aroundStart[v + 1]; ++i)
         {
-            uint32_t corner = mesh.around[i], into = corner - corner % 3 + (corner % 3 + 2) % 3;
+            uint32_t corner = mesh.around[i], into = PreviousCorner(corner);
             open = open || mesh.twin[corner] == kNoTwin || mesh.twin[into] == kNoTwin;
             uint32_t c = chartOf[corner / 3], k = 0;
             if (c == kNoChart)

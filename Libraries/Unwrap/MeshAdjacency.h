@@ -10,6 +10,8 @@
 const uint32_t kNoTwin = 0xFFFFFFFFu;
 
 inline uint32_t NextCorner(uint32_t halfEdge) { return halfEdge % 3 == 2 ? halfEdge - 2 : halfEdge + 1; }
+// The half-edge that ends where `halfEdge` starts, in the same triangle.
+inline uint32_t PreviousCorner(uint32_t halfEdge) { return halfEdge % 3 == 0 ? halfEdge + 2 : halfEdge - 1; }
 
 // Fills twin[3 * triCount] in time linear in vertexCount + triCount (two counting sorts of the
 // half-edges by their end vertices). Every index must be below vertexCount. False when scratch
